@@ -1,0 +1,163 @@
+package com.tav.android.pixara.photoretouching.glimmer;
+
+import com.tav.android.pixara.photoretouching.jni.Engine;
+import com.tav.android.pixara.photoretouching.jni.Rect;
+
+import java.util.ArrayList;
+import java.util.Collections;
+import java.util.LinkedHashMap;
+import java.util.List;
+import java.util.Map;
+
+/**
+ * Every operation the command line offers, described once: its name, help,
+ * parameters with their ranges, and how it calls {@link Engine}. The table
+ * drives parsing, range checks, {@code glimmer list} and the demo; a new
+ * operation is one more row.
+ */
+public final class Operations {
+    private Operations() {
+    }
+
+    /** An integer parameter: accepted range, the engine's neutral value, the value the demo shows. */
+    public record Param(String name, int min, int max, int neutral, int demo, String help) {
+    }
+
+    /** One run of an operation on a picture. */
+    public static final class Job {
+        public final int[] in;
+        public final int[] out;
+        public final int width;
+        public final int height;
+        /** Selection: the mask (1 = selected) and its rectangle; an empty rectangle means the whole picture. */
+        public final byte[] mask;
+        public final Rect rect;
+        private final Map<String, Integer> values;
+
+        Job(int[] in, int width, int height, byte[] mask, Rect rect, Map<String, Integer> values) {
+            this.in = in;
+            this.out = new int[in.length];
+            this.width = width;
+            this.height = height;
+            this.mask = mask;
+            this.rect = rect;
+            this.values = values;
+        }
+
+        public int value(String name) {
+            Integer v = values.get(name);
+            if (v == null) {
+                throw new IllegalStateException("no value for " + name);
+            }
+            return v;
+        }
+    }
+
+    /** What an operation does with a job; a failure is reported as an exception with one clear line. */
+    @FunctionalInterface
+    public interface Action {
+        void apply(Job job) throws OperationException;
+    }
+
+    public static final class OperationException extends Exception {
+        private static final long serialVersionUID = 1L;
+
+        public OperationException(String message) {
+            super(message);
+        }
+    }
+
+    public record Operation(String name, String help, boolean regional, List<Param> params, Action action) {
+        public Param param(String name) {
+            for (Param p : params) {
+                if (p.name().equals(name)) {
+                    return p;
+                }
+            }
+            return null;
+        }
+
+        /** Values for a run: each parameter's neutral value, or its demo value. */
+        public Map<String, Integer> defaults(boolean demo) {
+            Map<String, Integer> m = new LinkedHashMap<>();
+            for (Param p : params) {
+                m.put(p.name(), demo ? p.demo() : p.neutral());
+            }
+            return m;
+        }
+    }
+
+    /** Engine region method with one level. */
+    @FunctionalInterface
+    interface RegionMethod {
+        void call(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+    }
+
+    /** Engine method returning a status code. */
+    @FunctionalInterface
+    interface StatusAction {
+        int call(Job job);
+    }
+
+    private static Operation region(String name, String help, Param level, RegionMethod m) {
+        return new Operation(name, help, true, List.of(level),
+                j -> m.call(j.in, j.mask, j.out, j.width, j.height, j.value(level.name()), j.rect));
+    }
+
+    private static Operation status(String name, String help, boolean regional, List<Param> params, StatusAction a) {
+        return new Operation(name, help, regional, params, j -> {
+            int rc = a.call(j);
+            if (rc != Engine.SUCCESS) {
+                throw new OperationException(name + " failed with result code " + rc);
+            }
+        });
+    }
+
+    private static Param level(int min, int max, int neutral, int demo, String help) {
+        return new Param("level", min, max, neutral, demo, help);
+    }
+
+    private static final List<Operation> ALL;
+
+    static {
+        List<Operation> ops = new ArrayList<>();
+        ops.add(region("brightness", "Brightness", level(0, 20, 10, 14, "0 darkest, 10 unchanged, 20 brightest"),
+                Engine::controlBrightness));
+        ops.add(region("brightness100", "Brightness on the 0..100 scale",
+                level(0, 100, 50, 70, "50 unchanged"), Engine::controlBrightnessRange100));
+        ops.add(region("contrast", "Contrast; channels never cross mid-grey",
+                level(0, 20, 10, 16, "0 flat, 10 unchanged, 20 strongest"), Engine::controlContrast));
+        ops.add(region("contrast100", "Contrast on the 0..100 scale",
+                level(0, 100, 50, 80, "50 unchanged"), Engine::controlContrastRange100));
+        ops.add(region("saturation", "Colour saturation",
+                level(0, 20, 10, 16, "0 grey, 10 unchanged, 20 twice the colour"), Engine::controlSaturation));
+        ops.add(region("saturation100", "Colour saturation on the 0..100 scale",
+                level(0, 100, 50, 80, "50 unchanged"), Engine::controlSaturationRange100));
+        ops.add(region("temperature", "Colour temperature",
+                level(0, 20, 10, 15, "0 coolest, 10 unchanged, 20 warmest"), Engine::controlTemperature));
+        ops.add(region("temperature100", "Colour temperature on the 0..100 scale",
+                level(0, 100, 50, 25, "50 unchanged"), Engine::controlTemperatureRange100));
+        ops.add(region("exposure", "Exposure: channels times level / 10",
+                level(0, 40, 10, 14, "10 unchanged"), Engine::controlExposure));
+        ops.add(region("faded", "Faded colour film look",
+                level(0, 100, 0, 70, "0 unchanged, 100 strongest"), Engine::controlFadedColour));
+        ops.add(region("greyscale", "Greyscale with a brightness gain",
+                level(0, 20, 10, 10, "10 plain grey"), Engine::controlGreyscale));
+        ops.add(status("sepia", "Sepia tone", true, List.of(), j -> Engine.applySepiaPartial(
+                j.in, j.mask, j.out, j.width, j.height, j.rect)));
+        ALL = Collections.unmodifiableList(ops);
+    }
+
+    public static List<Operation> all() {
+        return ALL;
+    }
+
+    public static Operation find(String name) {
+        for (Operation op : ALL) {
+            if (op.name().equals(name)) {
+                return op;
+            }
+        }
+        return null;
+    }
+}

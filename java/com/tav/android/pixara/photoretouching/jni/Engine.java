@@ -1,0 +1,115 @@
+package com.tav.android.pixara.photoretouching.jni;
+
+/**
+ * The native image-processing engine, {@code libglimmerEngine}.
+ *
+ * <h2>Pictures, masks, rectangles</h2>
+ * A picture is an {@code int[]} of {@code width * height} pixels, 0xAARRGGBB,
+ * rows top to bottom. Every operation keeps each pixel's alpha from its
+ * input. A mask is a {@code byte[]} of {@code width * height} bytes; only a
+ * byte equal to 1 selects its pixel. A {@link Rect} is inclusive; an empty one
+ * ({@code right < left} or {@code top > bottom}) means the whole picture and
+ * the mask is then not read. A rectangle reaching outside the picture is
+ * clipped to it. The caller owns every array; results are written into the
+ * output array it passes.
+ *
+ * <h2>Result codes</h2>
+ * {@link #SUCCESS} 40960, {@link #ERR_ALLOC} 40961 (a working buffer could not
+ * be allocated; the output is untouched), {@link #ERR_NULL} 40962 (a null or
+ * too short array, a size that is not positive or too large, or a rectangle
+ * wholly outside the picture; nothing is written), {@link #ERR_EFFECT} 40971
+ * (the effect library failed; the output is untouched). Methods declared
+ * {@code void} report nothing: refused arguments leave the output untouched
+ * and log one line.
+ *
+ * <h2>Threads and state</h2>
+ * Every method runs on the caller's thread and returns when the work is
+ * done. The library keeps some state between calls (saved mask and object);
+ * callers must not run two methods that share state at once.
+ */
+public final class Engine {
+    public static final int SUCCESS = 40960;
+    public static final int ERR_ALLOC = 40961;
+    public static final int ERR_NULL = 40962;
+    public static final int ERR_EFFECT = 40971;
+
+    static {
+        System.loadLibrary("glimmerEngine");
+    }
+
+    private Engine() {
+    }
+
+    // ---- tone adjustments -------------------------------------------------
+    // Region methods: (in, mask, out, width, height, level, rect). The output
+    // receives a copy of the input in which the selected pixels of the
+    // rectangle are adjusted, or the whole picture for an empty rectangle.
+
+    /** Brightness 0..20 (10 neutral): the luma moves by (level - 10) * 10; on the whole picture every channel does. */
+    public static native void controlBrightness(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Brightness 0..100 (50 neutral): offset (level - 50) * 2. */
+    public static native void controlBrightnessRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Contrast 0..20 (10 neutral); a channel never crosses mid-grey 128. */
+    public static native void controlContrast(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Contrast 0..100 (50 neutral). */
+    public static native void controlContrastRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Saturation 0..20 (10 neutral, 0 grey, 20 twice the colour). */
+    public static native void controlSaturation(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Saturation 0..100 (50 neutral). */
+    public static native void controlSaturationRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Colour temperature 0..20 (10 neutral; lower is bluer, higher warmer). */
+    public static native void controlTemperature(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Colour temperature 0..100 (50 neutral). */
+    public static native void controlTemperatureRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Exposure 0 and up (10 neutral): channels are multiplied by level / 10. A negative level does nothing. */
+    public static native void controlExposure(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Faded colour 0..100 (0 neutral): a warm, flat film look. A level above 100 does nothing. */
+    public static native void controlFadedColour(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Greyscale 0..20: grey at gain 1 + (level - 10) * 0.061. */
+    public static native void controlGreyscale(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    // ---- effects ---------------------------------------------------------
+
+    /** Sepia tone of the whole picture. Returns SUCCESS, ERR_NULL, ERR_ALLOC or ERR_EFFECT. */
+    public static native int applySepia(int[] in, int[] out, int width, int height);
+
+    /**
+     * Sepia tone of the selected pixels: the output gets the sepia pixel where
+     * the mask byte is 1 and the untouched input pixel elsewhere (everywhere
+     * sepia for an empty rectangle).
+     */
+    public static native int applySepiaPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    // ---- saved regions ----------------------------------------------------
+
+    /** Saves the rectangle of the mask (row length width), replacing the saved mask. Returns 0. */
+    public static native int storeMask(byte[] mask, int width, int height, Rect rect);
+
+    /** Saves the rectangle of the picture, replacing the saved object. Returns 0. */
+    public static native int storeObject(int[] image, int width, int height, Rect rect);
+
+    /** Copies the saved mask back into the rectangle; -1 when none is saved. */
+    public static native int recoverMask(byte[] mask, int width, int height, Rect rect);
+
+    /** Copies the saved object back into the rectangle; -1 when none is saved. */
+    public static native int recoverObject(int[] image, int width, int height, Rect rect);
+
+    /** Frees the saved mask. */
+    public static native void deleteStoredMask();
+
+    /** Frees the saved object. */
+    public static native void deleteStoredObject();
+
+    /** The effect library's version text. */
+    public static native String LibVersion();
+}

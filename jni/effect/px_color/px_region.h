@@ -1,0 +1,59 @@
+// The region rule shared by every region operation, and the pixel loop
+// shared by the whole-picture forms.
+//
+// A region operation copies the input to the output, then recomputes the
+// pixels of the rectangle whose mask byte is exactly 1 (mask row stride =
+// width). An empty rectangle (right < left or top > bottom) means the whole
+// picture and the mask is not read. A rectangle reaching outside the picture
+// is clipped to it; one lying wholly outside selects nothing.
+//
+// `fn` maps one 0xAARRGGBB pixel to its new value. Whole-picture work is
+// split over row bands (see px_parallel.h); the result is the same either way.
+#pragma once
+
+#include <cstdint>
+#include <cstring>
+
+#include "../kalo/px_parallel.h"
+#include "../px_types.h"
+
+template <class PixelFn>
+void px_map_pixels(const int* in, int* out, int width, int height, PixelFn fn) {
+  if (width <= 0 || height <= 0) return;
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      dst[i] = fn(src[i]);
+    }
+  });
+}
+
+template <class PixelFn>
+void px_region_map(const int* in, const unsigned char* mask, int* out, int width, int height, px_rect rect,
+                   PixelFn fn) {
+  if (width <= 0 || height <= 0) return;
+  if (px_rect_empty(rect)) {
+    px_map_pixels(in, out, width, height, fn);
+    return;
+  }
+  if (in != out) std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  const px_rect r = px_rect_clip(rect, width, height);
+  if (px_rect_empty(r)) return;
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  for (int y = r.top; y <= r.bottom; ++y) {
+    const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+    for (int x = r.left; x <= r.right; ++x) {
+      if (mask[row + x] == 1) dst[row + x] = fn(src[row + x]);
+    }
+  }
+}
+
+// Channel helpers for the pixel functions.
+inline int px_clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
+inline uint32_t px_argb(uint32_t alpha_source, int r, int g, int b) {
+  return (alpha_source & 0xFF000000u) | static_cast<uint32_t>(r) << 16 | static_cast<uint32_t>(g) << 8 |
+         static_cast<uint32_t>(b);
+}
