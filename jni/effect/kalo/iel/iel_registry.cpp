@@ -15,6 +15,18 @@ const IELEffectEntry kEffects[] = {
      [](structIELImage* in, structIELImage* out, structIELEffectParams* p) {
        return IEL_VariableBrightness_ARGB8888(in, out, level_of(p));
      }},
+
+    // painterly effects
+
+    // end of painterly effects
+
+    // halftone, kaleidoscope, reflection, region and vintage effects
+
+    // end of halftone, kaleidoscope, reflection, region and vintage effects
+
+    // variable blur
+
+    // end of variable blur
 };
 }  // namespace
 

@@ -99,12 +99,12 @@ public final class Operations {
         int call(Job job);
     }
 
-    private static Operation region(String name, String help, Param level, RegionMethod m) {
+    static Operation region(String name, String help, Param level, RegionMethod m) {
         return new Operation(name, help, true, List.of(level),
                 j -> m.call(j.in, j.mask, j.out, j.width, j.height, j.value(level.name()), j.rect));
     }
 
-    private static Operation status(String name, String help, boolean regional, List<Param> params, StatusAction a) {
+    static Operation status(String name, String help, boolean regional, List<Param> params, StatusAction a) {
         return new Operation(name, help, regional, params, j -> {
             int rc = a.call(j);
             if (rc != Engine.SUCCESS) {
@@ -113,7 +113,7 @@ public final class Operations {
         });
     }
 
-    private static Param level(int min, int max, int neutral, int demo, String help) {
+    static Param level(int min, int max, int neutral, int demo, String help) {
         return new Param("level", min, max, neutral, demo, help);
     }
 
@@ -121,30 +121,24 @@ public final class Operations {
 
     static {
         List<Operation> ops = new ArrayList<>();
-        ops.add(region("brightness", "Brightness", level(0, 20, 10, 14, "0 darkest, 10 unchanged, 20 brightest"),
-                Engine::controlBrightness));
-        ops.add(region("brightness100", "Brightness on the 0..100 scale",
-                level(0, 100, 50, 70, "50 unchanged"), Engine::controlBrightnessRange100));
-        ops.add(region("contrast", "Contrast; channels never cross mid-grey",
-                level(0, 20, 10, 16, "0 flat, 10 unchanged, 20 strongest"), Engine::controlContrast));
-        ops.add(region("contrast100", "Contrast on the 0..100 scale",
-                level(0, 100, 50, 80, "50 unchanged"), Engine::controlContrastRange100));
-        ops.add(region("saturation", "Colour saturation",
-                level(0, 20, 10, 16, "0 grey, 10 unchanged, 20 twice the colour"), Engine::controlSaturation));
-        ops.add(region("saturation100", "Colour saturation on the 0..100 scale",
-                level(0, 100, 50, 80, "50 unchanged"), Engine::controlSaturationRange100));
-        ops.add(region("temperature", "Colour temperature",
-                level(0, 20, 10, 15, "0 coolest, 10 unchanged, 20 warmest"), Engine::controlTemperature));
-        ops.add(region("temperature100", "Colour temperature on the 0..100 scale",
-                level(0, 100, 50, 25, "50 unchanged"), Engine::controlTemperatureRange100));
-        ops.add(region("exposure", "Exposure: channels times level / 10",
-                level(0, 40, 10, 14, "10 unchanged"), Engine::controlExposure));
-        ops.add(region("faded", "Faded colour film look",
-                level(0, 100, 0, 70, "0 unchanged, 100 strongest"), Engine::controlFadedColour));
-        ops.add(region("greyscale", "Greyscale with a brightness gain",
-                level(0, 20, 10, 10, "10 plain grey"), Engine::controlGreyscale));
-        ops.add(status("sepia", "Sepia tone", true, List.of(), j -> Engine.applySepiaPartial(
-                j.in, j.mask, j.out, j.width, j.height, j.rect)));
+        // One line an area; each area's class lists its own operations.
+        ops.addAll(ToneOperations.list());
+        // colour tools
+
+        // effects
+
+        // filters
+
+        // geometry
+
+        // blur
+
+        // object tools
+
+        // portrait
+
+        // backlight
+
         ALL = Collections.unmodifiableList(ops);
     }
 

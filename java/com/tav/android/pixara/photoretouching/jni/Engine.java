@@ -90,6 +90,38 @@ public final class Engine {
      */
     public static native int applySepiaPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
 
+    // ---- colour tools: hue, RGB balance, point colour, automatic adjustment, brushes, splash, lens tints ----
+
+    // (end of colour tools)
+
+    // ---- effects of the effect library: painterly, halftone, kaleidoscope, reflection, region, vintage ----
+
+    // (end of effects of the effect library)
+
+    // ---- filters: texture overlays, tone curves, shader-style looks ----
+
+    // (end of filters)
+
+    // ---- geometry: rotate, flip, straighten, crop, mirror, twirl, sphericity ----
+
+    // (end of geometry)
+
+    // ---- blur and depth of field: selective blur, tilt-shift, miniature ----
+
+    // (end of blur and depth of field)
+
+    // ---- object tools: eraser, copy and paste ----
+
+    // (end of object tools)
+
+    // ---- portrait retouching and red-eye ----
+
+    // (end of portrait retouching and red-eye)
+
+    // ---- backlight correction ----
+
+    // (end of backlight correction)
+
     // ---- saved regions ----------------------------------------------------
 
     /** Saves the rectangle of the mask (row length width), replacing the saved mask. Returns 0. */
