@@ -12,7 +12,6 @@ import java.awt.image.BufferedImage;
 import java.io.File;
 import java.io.IOException;
 import java.io.PrintStream;
-import java.util.ArrayList;
 import java.util.Arrays;
 import java.util.List;
 import javax.imageio.ImageIO;
@@ -25,6 +24,7 @@ import javax.imageio.ImageIO;
 final class Demo {
     private static final int THUMB = 150;
     private static final int LABEL = 16;
+    private static final int COLUMNS = 12;
 
     private Demo() {
     }
@@ -40,8 +40,10 @@ final class Demo {
             throw new IOException("cannot create " + outDir);
         }
         List<Operation> ops = Operations.all();
-        int cols = ops.size() + 1;
-        BufferedImage sheet = new BufferedImage(cols * THUMB, files.length * (THUMB + LABEL), BufferedImage.TYPE_INT_RGB);
+        // Each photo starts a new block of rows: the original, then every operation, COLUMNS a row.
+        int rowsPerPhoto = (ops.size() + 1 + COLUMNS - 1) / COLUMNS;
+        BufferedImage sheet = new BufferedImage(COLUMNS * THUMB, files.length * rowsPerPhoto * (THUMB + LABEL),
+                BufferedImage.TYPE_INT_RGB);
         Graphics2D g = sheet.createGraphics();
         g.setColor(Color.WHITE);
         g.fillRect(0, 0, sheet.getWidth(), sheet.getHeight());
@@ -51,8 +53,8 @@ final class Demo {
         for (File f : files) {
             Picture pic = Picture.read(f);
             String base = f.getName().replaceFirst("\\.[^.]+$", "");
-            int y = row * (THUMB + LABEL);
-            cell(g, pic.image(pic.pixels), 0, y, base);
+            int top = row * rowsPerPhoto * (THUMB + LABEL);
+            cell(g, pic.image(pic.pixels), 0, top, base);
             int col = 1;
             for (Operation op : ops) {
                 int[] rect = op.regional() ? centreRect(pic) : null;
@@ -60,7 +62,7 @@ final class Demo {
                 op.action().apply(job);
                 File result = new File(outDir, base + "-" + op.name() + ".png");
                 pic.write(job.out, result);
-                cell(g, pic.image(job.out), col * THUMB, y, op.name());
+                cell(g, pic.image(job.out), (col % COLUMNS) * THUMB, top + (col / COLUMNS) * (THUMB + LABEL), op.name());
                 col++;
             }
             out.println("demo: " + base + ": " + ops.size() + " results");
@@ -83,13 +85,5 @@ final class Demo {
         g.drawImage(img, x + (THUMB - w) / 2, y + (THUMB - h) / 2, w, h, null);
         g.setColor(Color.BLACK);
         g.drawString(label, x + 4, y + THUMB + LABEL - 4);
-    }
-
-    static List<String> names() {
-        List<String> n = new ArrayList<>();
-        for (Operation op : Operations.all()) {
-            n.add(op.name());
-        }
-        return n;
     }
 }

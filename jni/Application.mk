@@ -1,0 +1,3 @@
+APP_ABI := armeabi-v7a
+APP_PLATFORM := android-21
+APP_STL := c++_static
