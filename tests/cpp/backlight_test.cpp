@@ -310,4 +310,16 @@ TEST_F(Backlight, ReducedDisplayCopyIsCorrectedLikeTheFullPicture) {
   EXPECT_LE(c.sky_max_change, 6);
 }
 
+// The same pixels on every platform (32-bit ARM included): a fingerprint of
+// one rendering, recorded once and checked on each build.
+TEST_F(Backlight, SamePixelsOnEveryPlatform) {
+  const int w = 301, h = 203;
+  Picture in = backlit(w, h, 15);
+  ASSERT_EQ(PX_OK, px_blc_init(in.data(), w, h));
+  const Picture out = save(in, w, h, 85);
+  uint64_t fnv = 1469598103934665603ull;
+  for (int p : out) fnv = (fnv ^ static_cast<uint32_t>(p)) * 1099511628211ull;
+  EXPECT_EQ(4066598476316705936ull, fnv);
+}
+
 }  // namespace
