@@ -56,7 +56,7 @@ public class BacklightMeasure {
     static double[] score(int[] orig, int[] lit, int[] out, int w, int h) {
         double errSubject = 0;
         long ns = 0;
-        int[] change = new int[o(w, h)];
+        int[] change = new int[w * h];
         int nb = 0;
         double sumChange = 0;
         for (int y = 0; y < h; y++) {
@@ -81,10 +81,6 @@ public class BacklightMeasure {
         int[] c = Arrays.copyOf(change, nb);
         Arrays.sort(c);
         return new double[] {errSubject / ns, sumChange / (3.0 * nb), c[(int) (nb * 0.99)]};
-    }
-
-    static int o(int w, int h) {
-        return w * h;
     }
 
     static void row(String photo, String method, double[] s) {
