@@ -138,6 +138,7 @@ public final class Operations {
         // portrait
 
         // backlight
+        ops.addAll(BacklightOperations.list());
 
         ALL = Collections.unmodifiableList(ops);
     }

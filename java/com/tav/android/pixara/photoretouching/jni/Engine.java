@@ -119,6 +119,52 @@ public final class Engine {
     // (end of portrait retouching and red-eye)
 
     // ---- backlight correction ----
+    // A dark subject in front of a bright sky or window is brightened while
+    // the bright background stays nearly as it was. Sequence: autoBLCInit
+    // analyses the picture once; applyGammaTransformPreview and applyBLCSave
+    // render the correction at a strength as often as wanted; DeInitBLC frees
+    // the analysis. The analysis is kept in the library between calls (not
+    // locked: callers serialise these methods). The caller owns every array.
+
+    /**
+     * Analyses a picture for backlight correction and keeps the result,
+     * replacing any earlier analysis (its memory is freed).
+     *
+     * @param in     the picture, width * height ARGB pixels (only read)
+     * @param width  picture width, positive
+     * @param height picture height, positive
+     * @return SUCCESS; ERR_NULL for a null or too short array or a bad size
+     *         (the earlier analysis is kept); ERR_ALLOC when memory ran out
+     */
+    public static native int autoBLCInit(int[] in, int width, int height);
+
+    /**
+     * Renders the correction quickly for display. The picture should show the
+     * analysed scene and may be a reduced copy of it (any size: the analysis
+     * is scaled). The per-pixel weights of this picture are kept, so further
+     * calls with the same picture and another strength only redo the tone
+     * mapping. Gives exactly the pixels applyBLCSave gives for the same input.
+     *
+     * @param in       the picture, width * height ARGB pixels (only read)
+     * @param out      receives width * height pixels; alpha from the input; may be {@code in}
+     * @param width    picture width, positive
+     * @param height   picture height, positive
+     * @param strength 0..100 (clamped): 0 unchanged, 100 full correction; a
+     *                 picture that does not look backlit changes little at any strength
+     * @return SUCCESS; ERR_NULL when autoBLCInit has not succeeded since the
+     *         last DeInitBLC, or for a null or too short array or a bad size
+     *         (nothing written); ERR_ALLOC when memory ran out (nothing written)
+     */
+    public static native int applyGammaTransformPreview(int[] in, int[] out, int width, int height, int strength);
+
+    /**
+     * Renders the correction of the full-size picture; arguments and result
+     * codes as {@link #applyGammaTransformPreview}. Keeps nothing.
+     */
+    public static native int applyBLCSave(int[] in, int[] out, int width, int height, int strength);
+
+    /** Frees the analysis and the preview weights (each that is present). Returns 0; harmless when nothing is held. */
+    public static native int DeInitBLC();
 
     // (end of backlight correction)
 
