@@ -220,10 +220,16 @@ int32_t priority(const Work& w, int x, int y) { return confidence_term(w, x, y) 
 
 // ---- set-up ----------------------------------------------------------------------
 
-// The allowed source centres: every pixel of the candidate's window lies in
-// the working region and none is under the mask (inside the rectangle or
-// not), so patches come only from untouched picture, never from the object
-// nor from pixels filled earlier in the run.
+// Source map bits: a centre whose window lies in the working region and
+// holds no masked pixel (original picture); a centre whose window holds
+// filled pixels but no pixel still to fill nor masked outside the rectangle;
+// a pixel masked outside the rectangle (part of the object that stays).
+enum : unsigned char { kSourceOriginal = 1, kSourceFilled = 2, kForeign = 4 };
+
+// The allowed source centres (draw_source): patches come from the untouched
+// picture; never from the object. Centres over pixels filled earlier in the
+// run are allowed only as a fallback (see patch_texture), so the middle of a
+// hole wider than the search radius can still be reached nearby.
 bool draw_source(Work& w, const unsigned char* mask) {
   const int sw = w.rw + 1;
   int32_t* sum = static_cast<int32_t*>(px_calloc(static_cast<size_t>(sw) * (w.rh + 1), sizeof(int32_t)));
@@ -240,7 +246,13 @@ bool draw_source(Work& w, const unsigned char* mask) {
     for (int x = W; x + W < w.rw; ++x) {
       const int x0 = x - W, x1 = x + W + 1, y0 = y - W, y1 = y + W + 1;
       const int32_t bad = sum[y1 * sw + x1] - sum[y0 * sw + x1] - sum[y1 * sw + x0] + sum[y0 * sw + x0];
-      w.source[w.at(x, y)] = bad == 0;
+      if (bad == 0) w.source[w.at(x, y)] |= kSourceOriginal;
+    }
+  }
+  for (int y = 0; y < w.rh; ++y) {
+    for (int x = 0; x < w.rw; ++x) {
+      const int i = w.at(x, y);
+      if (w.state[i] == kKnown && mask[(w.oy + y) * w.width + w.ox + x] == 1) w.source[i] |= kForeign;
     }
   }
   px_free(sum);
@@ -384,12 +396,13 @@ bool segment_and_label(Work& w, px_rect seg) {
 
 // ---- one round --------------------------------------------------------------------
 
-// Finds the source centre for the target point (x, y): the allowed centre
-// within +-P of the point (the whole working region when none is allowed
-// there, so holes wider than the search radius are still filled) with the
-// least sum of absolute grey differences over the known window pixels of
-// the point's label (all known pixels when none carries it). Scanning is row
-// by row; the first of equal scores wins. False when no centre is allowed.
+// Finds the source centre for the target point (x, y): the centre with the
+// least sum of absolute grey differences over the known window pixels of the
+// point's label (all known pixels when none carries it). Candidates, in
+// this order until one is found: original-picture centres within +-P of the
+// point; also centres over filled pixels within +-P (the middle of a wide
+// hole); original centres anywhere in the working region. Scanning is row by
+// row; the first of equal scores wins. False when there is no candidate.
 bool patch_texture(const Work& w, int x, int y, int* sx, int* sy) {
   const int W = w.W;
   int off_x[169], off_y[169], tg[169];
@@ -413,14 +426,17 @@ bool patch_texture(const Work& w, int x, int y, int* sx, int* sy) {
   }
   int32_t best = 99999999;
   bool found = false;
-  for (int wide = 0; wide < 2 && !found; ++wide) {
+  static constexpr unsigned char kKinds[3] = {kSourceOriginal, kSourceOriginal | kSourceFilled, kSourceOriginal};
+  for (int stage = 0; stage < 3 && !found; ++stage) {
+    const bool wide = stage == 2;
+    const unsigned char kinds = kKinds[stage];
     const int x0 = wide ? 0 : (x - w.P < 0 ? 0 : x - w.P);
     const int x1 = wide ? w.rw - 1 : (x + w.P >= w.rw ? w.rw - 1 : x + w.P);
     const int y0 = wide ? 0 : (y - w.P < 0 ? 0 : y - w.P);
     const int y1 = wide ? w.rh - 1 : (y + w.P >= w.rh ? w.rh - 1 : y + w.P);
     for (int cy = y0; cy <= y1; ++cy) {
       for (int cx = x0; cx <= x1; ++cx) {
-        if (!w.source[w.at(cx, cy)]) continue;
+        if (!(w.source[w.at(cx, cy)] & kinds)) continue;
         const unsigned char* g = w.gray + w.at(cx, cy);
         int32_t sum = 0;
         for (int k = 0; k < n && sum < best; ++k) {
@@ -437,6 +453,32 @@ bool patch_texture(const Work& w, int x, int y, int* sx, int* sy) {
     }
   }
   return found;
+}
+
+// Centres around a filled patch whose windows are now wholly filled or
+// original (and hold nothing masked outside the rectangle) become fallback
+// sources.
+void update_source(Work& w, int x, int y) {
+  const int W = w.W, r = 2 * W;
+  for (int cy = y - r; cy <= y + r; ++cy) {
+    if (cy - W < 0 || cy + W >= w.rh) continue;
+    for (int cx = x - r; cx <= x + r; ++cx) {
+      if (cx - W < 0 || cx + W >= w.rw) continue;
+      unsigned char& s = w.source[w.at(cx, cy)];
+      if (s & (kSourceOriginal | kSourceFilled)) continue;
+      bool ok = true;
+      for (int yy = cy - W; yy <= cy + W && ok; ++yy) {
+        for (int xx = cx - W; xx <= cx + W; ++xx) {
+          const int i = w.at(xx, yy);
+          if (w.state[i] != kKnown || (w.source[i] & kForeign)) {
+            ok = false;
+            break;
+          }
+        }
+      }
+      if (ok) s |= kSourceFilled;
+    }
+  }
 }
 
 // Copies the source window into the unfilled pixels of the target window
@@ -763,6 +805,7 @@ int process_photoeraser(int* picture, const unsigned char* mask, int width, int 
     update_fixed(w, tx, ty, sx, sy);
     update_boundary(w, tx, ty);
     update_pri_fixed(w, tx, ty);
+    update_source(w, tx, ty);
     if (round % 4 == 0 && g_progress) g_progress(g_progress_context, round);
   }
   return finish(w, PX_OK);
