@@ -66,7 +66,7 @@ public final class Glimmer {
     }
 
     static void usage(PrintStream out) {
-        out.println("usage: glimmer <operation> [name=value ...] [rect=left,top,right,bottom] in.(png|jpg) out.png");
+        out.println("usage: glimmer <operation> [name=value ...] [rect=left,top,right,bottom] [mask=mask.png] in.(png|jpg) out.png");
         out.println("       glimmer list            operations and their parameters");
         out.println("       glimmer demo [samples] [out]   every operation on the sample photos, and a contact sheet");
         out.println("       glimmer version");
@@ -91,6 +91,7 @@ public final class Glimmer {
         }
         Map<String, Integer> values = op.defaults(false);
         int[] rect = null;
+        File maskFile = null;
         for (int i = 1; i < args.length - 2; i++) {
             String a = args[i];
             int eq = a.indexOf('=');
@@ -103,6 +104,10 @@ public final class Glimmer {
                 rect = parseRect(value);
                 continue;
             }
+            if (name.equals("mask") && op.regional()) {
+                maskFile = new File(value);
+                continue;
+            }
             Param p = op.param(name);
             if (p == null) {
                 throw new UsageException(op.name() + " has no parameter '" + name + "'");
@@ -112,7 +117,7 @@ public final class Glimmer {
         File in = new File(args[args.length - 2]);
         File outFile = new File(args[args.length - 1]);
         Picture pic = Picture.read(in);
-        Job job = pic.job(values, rect);
+        Job job = maskFile == null ? pic.job(values, rect) : maskJob(pic, values, rect, maskFile);
         op.action().apply(job);
         pic.write(job.out, outFile);
         out.println("wrote " + outFile);
@@ -148,6 +153,27 @@ public final class Glimmer {
             throw new UsageException("rect " + value + " is empty (right < left or bottom < top)");
         }
         return r;
+    }
+
+    /**
+     * A job whose selection is a mask picture of the same size: pixels
+     * brighter than mid-grey and not transparent are selected, within the
+     * rectangle when one is given.
+     */
+    static Job maskJob(Picture pic, Map<String, Integer> values, int[] rect, File maskFile) throws UsageException {
+        Picture m = Picture.read(maskFile);
+        if (m.width != pic.width || m.height != pic.height) {
+            throw new UsageException("mask " + maskFile + " is " + m.width + "x" + m.height + ", the picture "
+                    + pic.width + "x" + pic.height);
+        }
+        byte[] mask = new byte[pic.width * pic.height];
+        for (int i = 0; i < mask.length; i++) {
+            int p = m.pixels[i];
+            int y = (((p >> 16) & 255) * 299 + ((p >> 8) & 255) * 587 + (p & 255) * 114) / 1000;
+            mask[i] = (p >>> 24) != 0 && y > 127 ? (byte) 1 : 0;
+        }
+        Rect r = rect == null ? Rect.whole() : new Rect(rect[0], rect[1], rect[2], rect[3]);
+        return new Job(pic.pixels.clone(), pic.width, pic.height, mask, r, values);
     }
 
     /** The selection for a rectangle: an ellipse inscribed in it. */

@@ -134,6 +134,7 @@ public final class Operations {
         // blur
 
         // object tools
+        ops.addAll(ObjectOperations.list());
 
         // portrait
 

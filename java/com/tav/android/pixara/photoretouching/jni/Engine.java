@@ -112,6 +112,108 @@ public final class Engine {
 
     // ---- object tools: eraser, copy and paste ----
 
+    /** Eraser status: idle or finished. */
+    public static final int ERASER_IDLE = 53249;
+    /** Eraser status: paused by {@link #stopEraser}. */
+    public static final int ERASER_PAUSED = 53250;
+    /** Eraser status: running. */
+    public static final int ERASER_RUNNING = 53251;
+    /** Eraser control refused: the eraser is idle. */
+    public static final int ERR_ERASER_IDLE = 40965;
+    /** Restart refused: the eraser runs and is not paused. */
+    public static final int ERR_ERASER_NOT_PAUSED = 40966;
+    /** A run is already going on ({@link #runEraser}), or the run ended on {@link #exitEraser}. */
+    public static final int ERR_ERASER_BUSY = 40967;
+
+    /**
+     * Removes the object under the mask: the pixels of {@code image} whose mask
+     * byte is 1 inside {@code rect} (the whole picture for an empty rectangle)
+     * are filled, patch by patch from the outside in, with patches of the
+     * surrounding picture. The image is changed in place and keeps each
+     * pixel's alpha; the mask is only read. Runs on the calling thread for as
+     * long as the fill takes; every 4 rounds the partly filled picture is
+     * committed to {@code image}, so another thread may show the progress.
+     * While it runs, another thread may call {@link #stopEraser},
+     * {@link #reStartEraser}, {@link #exitEraser} and {@link #getEraserStatus}.
+     *
+     * @return SUCCESS when done, ERR_ERASER_BUSY when a run is already going on
+     *     (nothing touched) or when {@link #exitEraser} ended this run early (the
+     *     image holds what was filled so far), ERR_ALLOC, or ERR_NULL for
+     *     refused arguments
+     */
+    public static native int runEraser(int[] image, byte[] mask, int width, int height, Rect rect);
+
+    /** Overwrites the eraser status word (ERASER_IDLE, ERASER_PAUSED, ERASER_RUNNING). */
+    public static native void setEraserStatus(int status);
+
+    /** The eraser status word: ERASER_IDLE, ERASER_RUNNING or ERASER_PAUSED. */
+    public static native int getEraserStatus();
+
+    /** Pauses the running eraser at its next round: SUCCESS, or ERR_ERASER_IDLE. */
+    public static native int stopEraser();
+
+    /** Resumes a paused eraser: SUCCESS, ERR_ERASER_IDLE, or ERR_ERASER_NOT_PAUSED. */
+    public static native int reStartEraser();
+
+    /** Ends the running eraser at its next round (it returns ERR_ERASER_BUSY): SUCCESS, or ERR_ERASER_IDLE. */
+    public static native int exitEraser();
+
+    /**
+     * Closes notches in an object mask (1 object, 2 and 3 its border band, 0
+     * outside) inside {@code rect}, {@code iterations} times: a 0 pixel with at
+     * least four of its eight neighbours equal to 1 becomes 1. The rectangle,
+     * clipped to the picture, is written back into {@code rect}.
+     *
+     * @return SUCCESS, or ERR_NULL for refused arguments
+     */
+    public static native int setObjectRegion(byte[] mask, int width, int height, Rect rect, int iterations);
+
+    /**
+     * Recolours, in place, the pixels of {@code object} (width x height) whose
+     * mask byte is 1 to the colour balance of the whole {@code target} picture;
+     * the means of the object are taken over every non-zero mask byte. Alpha is
+     * kept; a black object or target keeps its colours.
+     *
+     * @return SUCCESS, or ERR_NULL for refused arguments
+     */
+    public static native int runCopyObject(int[] object, byte[] mask, int width, int height, int[] target,
+            int targetWidth, int targetHeight);
+
+    /**
+     * Writes into {@code out} (width x height) the picture with the object
+     * (objWidth x objHeight, with its mask of the same size) pasted with its
+     * top-left corner at ({@code rect.left}, {@code rect.top}): object pixels of
+     * mask 1 and non-zero alpha are recoloured to the picture's colour balance,
+     * and those next to the border band (mask 2 or 3) are blended with the
+     * background. Parts reaching outside the picture are left out.
+     *
+     * @return SUCCESS, or ERR_NULL for refused arguments
+     */
+    public static native int runCopyPaste(int[] object, int[] picture, byte[] mask, int[] out, int objWidth,
+            int objHeight, int width, int height, Rect rect);
+
+    /**
+     * Writes into {@code out} the background with every object pixel of mask 1
+     * and non-zero alpha copied unchanged to ({@code rect.left} + x,
+     * {@code rect.top} + y). Parts reaching outside the picture are left out.
+     *
+     * @return SUCCESS, or ERR_NULL for refused arguments
+     */
+    public static native int pasteObject(int[] object, int[] background, byte[] mask, int[] out, int objWidth,
+            int objHeight, int width, int height, Rect rect);
+
+    /**
+     * Draws the region {@code rect} of {@code src} scaled down by {@code scale}
+     * (source pixels per destination pixel) into {@code dst}, at the scaled
+     * position: destination rows round(top / scale) .. round(bottom / scale)
+     * inclusive, columns round(left / scale) up to but not including
+     * round(right / scale). Only pixels inside both pictures are touched.
+     *
+     * @return 0
+     */
+    public static native int drawObject(int[] dst, int dstWidth, int dstHeight, int[] src, int srcWidth,
+            int srcHeight, float scale, Rect rect);
+
     // (end of object tools)
 
     // ---- portrait retouching and red-eye ----
