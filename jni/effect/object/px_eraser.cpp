@@ -398,11 +398,11 @@ bool segment_and_label(Work& w, px_rect seg) {
 
 // Finds the source centre for the target point (x, y): the centre with the
 // least sum of absolute grey differences over the known window pixels of the
-// point's label (all known pixels when none carries it). Candidates, in
-// this order until one is found: original-picture centres within +-P of the
-// point; also centres over filled pixels within +-P (the middle of a wide
-// hole); original centres anywhere in the working region. Scanning is row by
-// row; the first of equal scores wins. False when there is no candidate.
+// point's label (all known pixels when none carries it). Candidates lie
+// within +-P of the point: original-picture centres first; when there is
+// none, also centres over pixels filled earlier in the run (the middle of a
+// wide hole). Scanning is row by row; the first of equal scores wins. False
+// when there is no candidate: the run then ends.
 bool patch_texture(const Work& w, int x, int y, int* sx, int* sy) {
   const int W = w.W;
   int off_x[169], off_y[169], tg[169];
@@ -426,14 +426,13 @@ bool patch_texture(const Work& w, int x, int y, int* sx, int* sy) {
   }
   int32_t best = 99999999;
   bool found = false;
-  static constexpr unsigned char kKinds[3] = {kSourceOriginal, kSourceOriginal | kSourceFilled, kSourceOriginal};
-  for (int stage = 0; stage < 3 && !found; ++stage) {
-    const bool wide = stage == 2;
+  static constexpr unsigned char kKinds[2] = {kSourceOriginal, kSourceOriginal | kSourceFilled};
+  const int x0 = x - w.P < 0 ? 0 : x - w.P;
+  const int x1 = x + w.P >= w.rw ? w.rw - 1 : x + w.P;
+  const int y0 = y - w.P < 0 ? 0 : y - w.P;
+  const int y1 = y + w.P >= w.rh ? w.rh - 1 : y + w.P;
+  for (int stage = 0; stage < 2 && !found; ++stage) {
     const unsigned char kinds = kKinds[stage];
-    const int x0 = wide ? 0 : (x - w.P < 0 ? 0 : x - w.P);
-    const int x1 = wide ? w.rw - 1 : (x + w.P >= w.rw ? w.rw - 1 : x + w.P);
-    const int y0 = wide ? 0 : (y - w.P < 0 ? 0 : y - w.P);
-    const int y1 = wide ? w.rh - 1 : (y + w.P >= w.rh ? w.rh - 1 : y + w.P);
     for (int cy = y0; cy <= y1; ++cy) {
       for (int cx = x0; cx <= x1; ++cx) {
         if (!(w.source[w.at(cx, cy)] & kinds)) continue;
