@@ -59,8 +59,8 @@ final class Demo {
                 Job job = pic.job(op.defaults(true), rect);
                 op.action().apply(job);
                 File result = new File(outDir, base + "-" + op.name() + ".png");
-                pic.write(job.out, result);
-                cell(g, pic.image(job.out), col * THUMB, y, op.name());
+                Picture.write(job.result(), job.resultWidth(), job.resultHeight(), result);
+                cell(g, Picture.image(job.result(), job.resultWidth(), job.resultHeight()), col * THUMB, y, op.name());
                 col++;
             }
             out.println("demo: " + base + ": " + ops.size() + " results");

@@ -114,7 +114,7 @@ public final class Glimmer {
         Picture pic = Picture.read(in);
         Job job = pic.job(values, rect);
         op.action().apply(job);
-        pic.write(job.out, outFile);
+        Picture.write(job.result(), job.resultWidth(), job.resultHeight(), outFile);
         out.println("wrote " + outFile);
     }
 
