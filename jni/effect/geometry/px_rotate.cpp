@@ -77,20 +77,28 @@ int px_rotate_flip(int* src, int* dst, int width, int height, int rotation, int 
     case 1:
     case 2:
     case 3:
-      // Each source row writes its own set of destination pixels.
+      // Each source row writes its own set of destination pixels. The turns
+      // walk 32 x 32 tiles so the destination columns stay in cache.
       px_for_rows(height, [&](int y0, int y1) {
-        for (size_t y = static_cast<size_t>(y0); y < static_cast<size_t>(y1); ++y) {
-          const int* s = src + y * w;
-          for (size_t x = 0; x < w; ++x) {
-            size_t at;
-            if (rotation == 1) {
-              at = x * h + (h - 1 - y);
-            } else if (rotation == 2) {
-              at = (h - 1 - y) * w + (w - 1 - x);
-            } else {
-              at = (w - 1 - x) * h + y;
+        constexpr size_t kTile = 32;
+        for (size_t ty = static_cast<size_t>(y0); ty < static_cast<size_t>(y1); ty += kTile) {
+          const size_t ty1 = ty + kTile < static_cast<size_t>(y1) ? ty + kTile : static_cast<size_t>(y1);
+          for (size_t tx = 0; tx < w; tx += kTile) {
+            const size_t tx1 = tx + kTile < w ? tx + kTile : w;
+            for (size_t y = ty; y < ty1; ++y) {
+              const int* s = src + y * w;
+              for (size_t x = tx; x < tx1; ++x) {
+                size_t at;
+                if (rotation == 1) {
+                  at = x * h + (h - 1 - y);
+                } else if (rotation == 2) {
+                  at = (h - 1 - y) * w + (w - 1 - x);
+                } else {
+                  at = (w - 1 - x) * h + y;
+                }
+                dst[at] = s[x];
+              }
             }
-            dst[at] = s[x];
           }
         }
       });
