@@ -61,8 +61,9 @@ final class Demo {
                 Job job = pic.job(op.defaults(true), rect);
                 op.action().apply(job);
                 File result = new File(outDir, base + "-" + op.name() + ".png");
-                pic.write(job.out, result);
-                cell(g, pic.image(job.out), (col % COLUMNS) * THUMB, top + (col / COLUMNS) * (THUMB + LABEL), op.name());
+                Picture.write(job.result(), job.resultWidth(), job.resultHeight(), result);
+                cell(g, Picture.image(job.result(), job.resultWidth(), job.resultHeight()), (col % COLUMNS) * THUMB,
+                        top + (col / COLUMNS) * (THUMB + LABEL), op.name());
                 col++;
             }
             out.println("demo: " + base + ": " + ops.size() + " results");

@@ -119,7 +119,7 @@ public final class Glimmer {
         Picture pic = Picture.read(in);
         Job job = maskFile == null ? pic.job(values, rect) : maskJob(pic, values, rect, maskFile);
         op.action().apply(job);
-        pic.write(job.out, outFile);
+        Picture.write(job.result(), job.resultWidth(), job.resultHeight(), outFile);
         out.println("wrote " + outFile);
     }
 

@@ -44,6 +44,38 @@ public final class Operations {
             this.values = values;
         }
 
+        private int[] result;
+        private int resultWidth;
+        private int resultHeight;
+
+        /**
+         * Sets the picture the operation produced when its size differs from
+         * the input's (a turn, crop or mirror); {@code pixels} holds at least
+         * width * height values.
+         */
+        public void replaceResult(int[] pixels, int width, int height) {
+            if (width <= 0 || height <= 0 || pixels.length < width * height) {
+                throw new IllegalArgumentException("result " + width + "x" + height + " does not fit "
+                        + pixels.length + " pixels");
+            }
+            this.result = pixels;
+            this.resultWidth = width;
+            this.resultHeight = height;
+        }
+
+        /** The picture the operation produced: {@link #out}, unless an action replaced it. */
+        public int[] result() {
+            return result == null ? out : result;
+        }
+
+        public int resultWidth() {
+            return result == null ? width : resultWidth;
+        }
+
+        public int resultHeight() {
+            return result == null ? height : resultHeight;
+        }
+
         public int value(String name) {
             Integer v = values.get(name);
             if (v == null) {
@@ -130,6 +162,7 @@ public final class Operations {
         // filters
 
         // geometry
+        ops.addAll(GeometryOperations.list());
 
         // blur
 

@@ -41,17 +41,26 @@ final class Picture {
     }
 
     BufferedImage image(int[] argb) {
+        return image(argb, width, height);
+    }
+
+    /** A picture of its own size (an operation's result may differ from the input's size). */
+    static BufferedImage image(int[] argb, int width, int height) {
         BufferedImage img = new BufferedImage(width, height, BufferedImage.TYPE_INT_ARGB);
         img.setRGB(0, 0, width, height, argb, 0, width);
         return img;
     }
 
     void write(int[] argb, File file) throws java.io.IOException {
+        write(argb, width, height, file);
+    }
+
+    static void write(int[] argb, int width, int height, File file) throws java.io.IOException {
         File parent = file.getAbsoluteFile().getParentFile();
         if (parent != null && !parent.isDirectory() && !parent.mkdirs()) {
             throw new IOException("cannot create " + parent);
         }
-        if (!ImageIO.write(image(argb), "png", file)) {
+        if (!ImageIO.write(image(argb, width, height), "png", file)) {
             throw new IOException("no PNG writer for " + file);
         }
     }

@@ -104,6 +104,135 @@ public final class Engine {
 
     // ---- geometry: rotate, flip, straighten, crop, mirror, twirl, sphericity ----
 
+    // Pictures are changed whole, alpha included. Angles are whole degrees,
+    // taken through the engine's fixed angle (90 degrees is a little past an
+    // exact quarter turn); a positive angle turns the picture clockwise on
+    // screen in runRotateN and the straighten methods.
+
+    /** Mirror: reflect across a horizontal line at row {@code pos}; the height changes. */
+    public static final int MIRROR_AXIS_UP_DOWN = 0xE001;
+    /** Mirror: reflect across a vertical line at column {@code pos}; the width changes. */
+    public static final int MIRROR_AXIS_LEFT_RIGHT = 0xE002;
+    /** With {@link #MIRROR_AXIS_LEFT_RIGHT}: keep columns 0..pos and reflect them to the right. */
+    public static final int MIRROR_KEEP_LEFT = 0xE003;
+    /** With {@link #MIRROR_AXIS_LEFT_RIGHT}: keep columns pos..width-1 and reflect them to the left. */
+    public static final int MIRROR_KEEP_RIGHT = 0xE004;
+    /** With {@link #MIRROR_AXIS_UP_DOWN}: keep rows 0..pos and reflect them downward. */
+    public static final int MIRROR_KEEP_TOP = 0xE005;
+    /** With {@link #MIRROR_AXIS_UP_DOWN}: keep rows pos..height-1 and reflect them upward. */
+    public static final int MIRROR_KEEP_BOTTOM = 0xE006;
+
+    /**
+     * Flips and turns {@code pixels} (width * height, changed in place): the
+     * horizontal flip, then the vertical one, then the rotation code: 0 none,
+     * 1 quarter turn clockwise, 2 half turn, 3 quarter turn counter-clockwise
+     * (after 1 and 3 the picture is {@code height} wide and {@code width}
+     * tall), 4 flips only; code 4 without a flip leaves an all-zero picture.
+     * Returns SUCCESS, ERR_NULL (null or short array, bad size, code outside
+     * 0..4: the picture is untouched) or ERR_ALLOC.
+     */
+    public static native int runRotateFlip(int[] pixels, int width, int height, int rotation, boolean flipHorizontal,
+            boolean flipVertical);
+
+    /**
+     * Turns the rectangle of {@code src} (srcWidth x srcHeight, with its mask
+     * {@code srcMask} of the same size) by {@code angle} degrees about its
+     * centre into {@code dst} and {@code dstMask} (dstWidth x dstHeight, owned
+     * and sized by the caller, usually {@link #getRotateWidth} x
+     * {@link #getRotateHeight} of the rectangle). The rectangle's width over
+     * {@code divisorX} (height over {@code divisorY}) is the number of source
+     * pixels an output pixel steps: pass the rectangle's own size for a 1:1
+     * turn, the output size to fit the rectangle to the output. Output pixels
+     * and mask bytes whose source lies outside the picture keep their
+     * contents. The rectangle is clipped to the picture. Returns SUCCESS,
+     * ERR_NULL (null or short array, bad size, a divisor of 0, an empty
+     * rectangle or one outside the picture) or ERR_ALLOC.
+     */
+    public static native int runRotateN(int[] src, byte[] srcMask, int[] dst, byte[] dstMask, int srcWidth,
+            int srcHeight, int dstWidth, int dstHeight, int angle, Rect rect, int divisorX, int divisorY);
+
+    /** Width of the bounding box of a width x height picture turned by {@code angle} degrees. */
+    public static native int getRotateWidth(int width, int height, int angle);
+
+    /** Height of the bounding box of a width x height picture turned by {@code angle} degrees. */
+    public static native int getRotateHeight(int width, int height, int angle);
+
+    /**
+     * Straighten: {@code in} turned by {@code angle} degrees and scaled about
+     * its centre into {@code out} of the same size; a scale below 1 zooms in
+     * (choose one that hides the corners). Output pixels whose source lies
+     * outside the picture are not written.
+     */
+    public static native void runStraighten(int[] in, int[] out, int width, int height, int angle, float scale);
+
+    /**
+     * Straighten preview while dragging: {@code in} (srcWidth x srcHeight)
+     * turned by {@code angle} and shown {@code scale} times as large, centred
+     * in the canvas {@code out} (dstWidth x dstHeight), which is cleared to 0
+     * first. Only the turned picture's box is drawn; its vertical extent is
+     * that of the unscaled picture.
+     */
+    public static native void runStraightenOnMove(int[] in, int srcWidth, int srcHeight, int[] out, int dstWidth,
+            int dstHeight, int angle, float scale);
+
+    /**
+     * Straighten when the finger is lifted: the canvas {@code out}
+     * (dstWidth x dstHeight) is cleared to 0 and only its centred
+     * srcWidth x srcHeight area is drawn, {@code in} turned by {@code angle}
+     * and sampled {@code scale} source pixels an output pixel.
+     */
+    public static native void runStraightenOnUp(int[] in, int srcWidth, int srcHeight, int[] out, int dstWidth,
+            int dstHeight, int angle, float scale);
+
+    /**
+     * Crops {@code pixels} (width * height) to the rectangle (inclusive,
+     * clipped to the picture): the cropped rows are packed at the start of the
+     * array with row length right - left + 1, the rest is set to 0. An empty
+     * rectangle leaves an all-zero picture. Returns SUCCESS, ERR_NULL (null or
+     * short array, bad size, rectangle outside the picture) or ERR_ALLOC.
+     */
+    public static native int runCrop(int[] pixels, int width, int height, Rect rect);
+
+    /** Width of the mirrored picture: 2 * (pos + 1) keeping the left, 2 * (width - pos) keeping the right, else width. */
+    public static native int getMirrorOutwidth(int width, int pos, int mode, int axis);
+
+    /** Height of the mirrored picture: 2 * (pos + 1) keeping the top, 2 * (height - pos) keeping the bottom, else height. */
+    public static native int getMirrorOutheight(int height, int pos, int mode, int axis);
+
+    /**
+     * Mirror: keeps one side of the line at {@code pos} and reflects it onto
+     * the other into {@code out}, which must hold
+     * {@link #getMirrorOutwidth} x {@link #getMirrorOutheight} pixels (a
+     * picture of that size). A line outside the picture copies it unchanged.
+     * Returns SUCCESS, or ERR_NULL for a null or short array, a bad size, an
+     * unknown axis or a mode of the other axis.
+     */
+    public static native int runMirror(int[] in, int[] out, int width, int height, int pos, int mode, int axis);
+
+    /**
+     * Twirl: {@code out} receives a copy of {@code in}, then the pixels of the
+     * rectangle inside the circle are turned by an angle fading from
+     * {@code angle} degrees (-360..360) at the centre to none at the rim,
+     * colours interpolated, alpha kept. {@code half} computes every second
+     * row and column for a fast preview. Returns SUCCESS; ERR_NULL for a bad
+     * array, size or rectangle, a centre outside the picture, a radius below
+     * 1 or an angle out of range (output untouched). Angle 0 only copies, and
+     * returns a value that is not a result code (treat any result after angle
+     * 0 as success).
+     */
+    public static native int runTwirl(int[] in, int[] out, int width, int height, int centerX, int centerY,
+            int radius, int angle, Rect rect, boolean half);
+
+    /**
+     * Sphericity: {@code out} receives a copy of {@code in}, then the circle
+     * (worked on about 1.4 times the given radius) is bulged (strength 1..100)
+     * or pinched (-100..-1) over the rectangle. {@code half} as for twirl.
+     * Returns SUCCESS, or ERR_NULL as for twirl (strength outside -100..100).
+     */
+    public static native int runSphericity(int[] in, int[] out, int width, int height, int centerX, int centerY,
+            int radius, int strength, Rect rect, boolean half);
+
+
     // (end of geometry)
 
     // ---- blur and depth of field: selective blur, tilt-shift, miniature ----

@@ -1,0 +1,301 @@
+// Mirror, twirl and sphericity.
+#include <cstdint>
+#include <cstring>
+
+#include "../kalo/px_parallel.h"
+#include "../px_types.h"
+#include "px_geometry.h"
+#include "px_geometry_tables.h"
+
+namespace {
+constexpr int kDeg = 1 << 19;  // one degree in the twirl's angle units
+constexpr int kTurn = 360 * kDeg;
+
+size_t at(int x, int y, int width) { return static_cast<size_t>(y) * static_cast<size_t>(width) + x; }
+
+void copy_row(int* dst, const int* src, int count) {
+  if (count > 0) std::memcpy(dst, src, static_cast<size_t>(count) * 4);
+}
+
+int clamp(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
+
+// The pixel at a sub-pixel position (xi + fx / 2048, yi + fy / 2048), its
+// four neighbours clamped to the picture near the border.
+uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, int fy) {
+  int x0 = xi, x1 = xi + 1, y0 = yi, y1 = yi + 1;
+  if (!(xi >= 0 && xi < width - 1 && yi >= 0 && yi < height - 1)) {
+    x0 = clamp(x0, 0, width - 1);
+    x1 = clamp(x1, 0, width - 1);
+    y0 = clamp(y0, 0, height - 1);
+    y1 = clamp(y1, 0, height - 1);
+  }
+  const auto* s = reinterpret_cast<const uint32_t*>(src);
+  uint32_t out;
+  return Bilinear_Fixed(fx, fy, s[at(x0, y0, width)], s[at(x1, y0, width)], s[at(x0, y1, width)],
+                        s[at(x1, y1, width)], &out);
+}
+
+// Writes an interpolated colour at (x, y) with that pixel's alpha; in half
+// resolution also at its right, lower and diagonal neighbours (with the same
+// alpha of (x, y)) where they are inside the picture.
+void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
+  const uint32_t alpha = static_cast<uint32_t>(src[at(x, y, width)]) & 0xFF000000u;
+  const int v = static_cast<int>(alpha | (colour & 0xFFFFFFu));
+  dst[at(x, y, width)] = v;
+  if (!half) return;
+  const bool right = x + 1 < width, below = y + 1 < height;
+  if (below) dst[at(x, y + 1, width)] = v;
+  if (right) dst[at(x + 1, y, width)] = v;
+  if (right && below) dst[at(x + 1, y + 1, width)] = v;
+}
+
+// The visited positions of an inclusive range stepping by `step` from `lo`,
+// kept inside 0..limit-1 without changing which positions are visited.
+struct Span {
+  int first;
+  int count;
+};
+Span span(int lo, int hi, int limit, int step) {
+  long long first = lo;
+  if (first < 0) first += ((-first + step - 1) / step) * step;
+  const long long last = hi < limit - 1 ? hi : limit - 1;
+  if (first > last) return {0, 0};
+  return {static_cast<int>(first), static_cast<int>((last - first) / step + 1)};
+}
+
+// Runs fn(x, y) over the visited positions of the rectangle, row groups on
+// worker threads. Each visited row writes only its own row (and, in half
+// resolution, the row below it, which is never visited), so the result does
+// not depend on the split.
+template <class Fn>
+void visit(int width, int height, int left, int right, int top, int bottom, bool half, Fn fn) {
+  const int step = half ? 2 : 1;
+  const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
+  if (rows.count == 0 || cols.count == 0) return;
+  px_for_rows(
+      rows.count,
+      [&](int r0, int r1) {
+        for (int r = r0; r < r1; ++r) {
+          const int y = rows.first + r * step;
+          for (int c = 0, x = cols.first; c < cols.count; ++c, x += step) fn(x, y);
+        }
+      },
+      half ? 32 : 64);
+}
+
+// sqrt of t (0..2^30) with 2^30 -> 0x80000, through the step tables.
+int sqrt_step(int t) {
+  if ((t >> 8) <= 127) return SQRT_STEP_1[t >> 8];
+  if ((t >> 10) < 512) return SQRT_STEP_2[(t >> 10) - 32];
+  if ((t >> 11) < 1024) return SQRT_STEP_3[(t >> 11) - 256];
+  return SQRT_STEP_4[t >> 14];
+}
+
+struct Axis {
+  int whole;
+  int weight;  // 0..2048
+};
+
+// centre + D * trig, where D is a distance in 2^19 units and trig a Q15
+// sine or cosine. The middle and low bytes of D are deliberately weighted
+// above their place value; this is the twirl's look and is kept.
+Axis twirl_offset(int center, int D, int trig) {
+  const int c = trig < 0 ? -trig : trig;
+  const int hi = D >> 16, mid = (D >> 8) & 0xFF, lo = D & 0xFF;
+  const int A = lo * c, B = mid * c, H = hi * c;
+  const int F = (A & 0x1FFFFFF) + (B & 0x1FFFFFF) + ((H & 0x3FFFF) << 7);
+  const int n = (A >> 25) + (B >> 25) + (H >> 18) + (F >> 25);
+  const int f = F & 0x1FFFFFF;
+  if (trig >= 0) return {center + n, f >> 14};
+  return {center - 1 - n, (0x2000000 - f) >> 14};
+}
+
+// Magnitude product with the sign of d restored.
+int signed_product(int d, int n) {
+  const uint32_t mag = (d < 0 ? 0u - static_cast<uint32_t>(d) : static_cast<uint32_t>(d)) * static_cast<uint32_t>(n);
+  return static_cast<int>(d < 0 ? 0u - mag : mag);
+}
+}  // namespace
+
+// ---- mirror ------------------------------------------------------------------
+
+int px_get_mirror_out_width(int width, int pos, int mode, int axis) {
+  if (!(pos >= 0 && pos < width && width >= 0 && axis == MIRROR_AXIS_LEFT_RIGHT)) return width;
+  if (mode == MIRROR_KEEP_LEFT) return (pos + 1) * 2;
+  if (mode == MIRROR_KEEP_RIGHT) return (width - pos) * 2;
+  return width;
+}
+
+int px_get_mirror_out_height(int height, int pos, int mode, int axis) {
+  if (!(pos >= 0 && pos < height && height >= 0 && axis == MIRROR_AXIS_UP_DOWN)) return height;
+  if (mode == MIRROR_KEEP_TOP) return (pos + 1) * 2;
+  if (mode == MIRROR_KEEP_BOTTOM) return (height - pos) * 2;
+  return height;
+}
+
+int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidth, int dstHeight, int pos, int mode,
+              int axis) {
+  const bool left_right = axis == MIRROR_AXIS_LEFT_RIGHT, up_down = axis == MIRROR_AXIS_UP_DOWN;
+  if (!left_right && !up_down) return PX_ERR_NULL;
+  if (left_right && mode != MIRROR_KEEP_LEFT && mode != MIRROR_KEEP_RIGHT) return PX_ERR_NULL;
+  if (up_down && mode != MIRROR_KEEP_TOP && mode != MIRROR_KEEP_BOTTOM) return PX_ERR_NULL;
+  if (srcWidth <= 0 || srcHeight <= 0) return PX_ERR_NULL;
+  if (dstWidth != px_get_mirror_out_width(srcWidth, pos, mode, axis) ||
+      dstHeight != px_get_mirror_out_height(srcHeight, pos, mode, axis)) {
+    return PX_ERR_NULL;
+  }
+  const int limit = left_right ? srcWidth : srcHeight;
+  if (pos < 0 || pos >= limit) {
+    // A line outside the picture keeps nothing to reflect: the sizes stay
+    // as they are and the picture is copied unchanged.
+    std::memmove(dst, src, static_cast<size_t>(srcWidth) * static_cast<size_t>(srcHeight) * 4);
+    return PX_OK;
+  }
+  const int sw = srcWidth, dw = dstWidth;
+  if (mode == MIRROR_KEEP_LEFT) {
+    for (int y = 0; y < dstHeight; ++y) {
+      const int* s = src + at(0, y, sw);
+      int* d = dst + at(0, y, dw);
+      copy_row(d, s, pos + 1);
+      for (int x = pos + 1; x < dw; ++x) d[x] = s[dw - 1 - x];
+    }
+  } else if (mode == MIRROR_KEEP_RIGHT) {
+    for (int y = 0; y < dstHeight; ++y) {
+      const int* s = src + at(0, y, sw);
+      int* d = dst + at(0, y, dw);
+      for (int x = 0; x < dw / 2; ++x) d[x] = s[sw - 1 - x];
+      copy_row(d + dw / 2, s + pos, sw - pos);
+    }
+  } else if (mode == MIRROR_KEEP_TOP) {
+    for (int r = 0; r <= pos; ++r) copy_row(dst + at(0, r, sw), src + at(0, r, sw), sw);
+    for (int r = pos + 1; r < dstHeight; ++r) copy_row(dst + at(0, r, sw), src + at(0, dstHeight - 1 - r, sw), sw);
+  } else {
+    for (int r = 0; r < dstHeight / 2; ++r) copy_row(dst + at(0, r, sw), src + at(0, srcHeight - 1 - r, sw), sw);
+    for (int r = dstHeight / 2, from = pos; r < dstHeight; ++r, ++from) {
+      copy_row(dst + at(0, r, sw), src + at(0, from, sw), sw);
+    }
+  }
+  return PX_OK;
+}
+
+// ---- twirl and sphericity -------------------------------------------------------
+
+int FATAN2(int x, int y) {
+  if (y == 0) return x > 0 ? 90 * kDeg : (x < 0 ? 270 * kDeg : 0);
+  if (x == 0) return y > 0 ? 0 : 180 * kDeg;
+  const uint32_t ax = x < 0 ? 0u - static_cast<uint32_t>(x) : static_cast<uint32_t>(x);
+  const uint32_t ay = y < 0 ? 0u - static_cast<uint32_t>(y) : static_cast<uint32_t>(y);
+  const uint32_t big = ax > ay ? ax : ay, small = ax > ay ? ay : ax;
+  const uint32_t i = (small * (0x20000000u / big)) >> 18;
+  int a = i >= 2048 ? 45 * kDeg : ATAN[i];
+  if (ay < ax) a = 90 * kDeg - a;
+  if (x >= 0 && y >= 0) return a;
+  if (y > 0 && x < 0) return kTurn - a;
+  if (x > 0 && y < 0) return 180 * kDeg - a;
+  return a + 180 * kDeg;
+}
+
+uint32_t Bilinear_Fixed(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
+                        uint32_t bottomRight, uint32_t* out) {
+  uint32_t result = 0xFF000000u;
+  for (int shift = 16; shift >= 0; shift -= 8) {
+    const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
+    const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
+    const int top = tr * fx + tl * (2048 - fx);
+    const int bottom = br * fx + bl * (2048 - fx);
+    const int value = ((2048 - fy) * top + fy * bottom) >> 22;
+    result |= static_cast<uint32_t>(value & 255) << shift;
+  }
+  *out = result;
+  return result;
+}
+
+int px_twirl(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius, int angle,
+             int left, int right, int top, int bottom, int half) {
+  if (!(centerX >= 0 && centerX < width && centerY >= 0 && centerY < height && radius >= 1 && angle >= -360 &&
+        angle <= 360)) {
+    return PX_ERR_NULL;
+  }
+  void* copied = std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  // Angle 0 answers with what the copy returned (the output's address, cut
+  // to an int), not 0xA000; callers of old see it that way.
+  if (angle == 0) return static_cast<int>(reinterpret_cast<intptr_t>(copied));
+  if (bottom < top) return PX_OK;
+  const int r2 = radius * radius;
+  if (r2 <= 0) return PX_OK;  // the square wrapped past 32 bits: no pixel is inside
+  const int per = 0x40000000 / r2;
+  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+    const int dx = x - centerX, dy = y - centerY;
+    const int d2 = dx * dx + dy * dy;
+    if (d2 >= r2) return;
+    const int t = d2 * per;
+    if (t < 0 || t >= 0x40000000) return;  // reached only through wrapped sizes
+    const int s = sqrt_step(t);
+    const int D = s * radius;
+    int w = (0x80000 - s) * angle;
+    if (angle < 0) w += kTurn;
+    const uint32_t theta = static_cast<uint32_t>(w + FATAN2(dx, dy)) % static_cast<uint32_t>(kTurn);
+    const int k = static_cast<int>(theta / 360) >> 5;
+    int sn, cs;
+    if (k <= 4096) {
+      cs = SIN[4096 - k];
+      sn = SIN[k];
+    } else if (k < 8192) {
+      sn = SIN[8192 - k];
+      cs = -SIN[k - 4096];
+    } else if (k <= 12288) {
+      cs = -SIN[12288 - k];
+      sn = -SIN[k - 8192];
+    } else {
+      cs = SIN[k - 12288];
+      sn = -SIN[16384 - k];
+    }
+    const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
+    put(src, dst, width, height, x, y, sample(src, width, height, ax.whole, ay.whole, ax.weight, ay.weight),
+        half != 0);
+  });
+  return PX_OK;
+}
+
+int px_sphericity(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius,
+                  int strength, int left, int right, int top, int bottom, int half) {
+  if (!(centerX >= 0 && centerX < width && centerY >= 0 && centerY < height && radius > 0 && strength >= -100 &&
+        strength <= 100)) {
+    return PX_ERR_NULL;
+  }
+  std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  if (bottom < top) return PX_OK;
+  // The working radius is enlarged on purpose (about 1.4 times).
+  const int R2 = (500 * radius * radius + 128) >> 8;
+  if (R2 <= 0) return PX_OK;  // wrapped past 32 bits: no pixel is inside
+  const int per = 0x40000000 / R2;
+  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+    const int dx = x - centerX, dy = y - centerY;
+    const int d2 = dx * dx + dy * dy;
+    if (d2 > R2) return;
+    const int i = (per * d2) >> 22;
+    const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
+    int xi, yi, fx, fy;
+    if (strength >= 0) {
+      const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
+      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
+      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));
+      const int Dn = static_cast<int>(m + 0x40000);
+      xi = X / Dn;
+      yi = Y / Dn;
+      const int inv = 0x40000000 / Dn;
+      fx = (inv * (X - Dn * xi)) >> 19;
+      fy = (inv * (Y - Dn * yi)) >> 19;
+    } else {
+      const int n = (static_cast<int>(L) * (-30 * strength)) >> 12;
+      const int X = static_cast<int>(static_cast<uint32_t>(x) << 18) + signed_product(dx, n);
+      const int Y = static_cast<int>(static_cast<uint32_t>(y) << 18) + signed_product(dy, n);
+      xi = X >> 18;
+      yi = Y >> 18;
+      fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
+      fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
+    }
+    put(src, dst, width, height, x, y, sample(src, width, height, xi, yi, fx, fy), half != 0);
+  });
+  return PX_OK;
+}
