@@ -57,7 +57,7 @@ final class Demo {
             cell(g, pic.image(pic.pixels), 0, top, base);
             int col = 1;
             for (Operation op : ops) {
-                int[] rect = op.regional() ? centreRect(pic) : null;
+                int[] rect = op.regional() ? demoRect(pic, op) : null;
                 Job job = pic.job(op.defaults(true), rect);
                 op.action().apply(job);
                 File result = new File(outDir, base + "-" + op.name() + ".png");
@@ -75,8 +75,10 @@ final class Demo {
         out.println("wrote " + sheetFile);
     }
 
-    private static int[] centreRect(Picture pic) {
-        return new int[] {pic.width / 6, pic.height / 6, pic.width * 5 / 6, pic.height * 5 / 6};
+    private static int[] demoRect(Picture pic, Operation op) {
+        double[] f = op.demoRegion() != null ? op.demoRegion() : new double[] {1 / 6.0, 1 / 6.0, 5 / 6.0, 5 / 6.0};
+        return new int[] {(int) (pic.width * f[0]), (int) (pic.height * f[1]), (int) (pic.width * f[2]),
+            (int) (pic.height * f[3])};
     }
 
     private static void cell(Graphics2D g, BufferedImage img, int x, int y, String label) {

@@ -19,7 +19,7 @@ final class ObjectOperations {
     static List<Operation> list() {
         List<Operation> ops = new ArrayList<>();
         ops.add(status("erase", "Remove the selected object (rect= selects an ellipse, mask=file.png a painted mask)",
-                true, List.of(), ObjectOperations::erase));
+                true, List.of(), ObjectOperations::erase).withDemoRegion(0.40, 0.52, 0.56, 0.66));
         ops.add(status("copy-paste", "Copy the selected object (rect= ellipse) and paste it at x,y, recoloured and"
                 + " with its border blended", true,
                 List.of(new Param("x", -100000, 100000, 0, 16, "left edge of the pasted object"),

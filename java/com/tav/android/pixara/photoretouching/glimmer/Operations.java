@@ -99,7 +99,21 @@ public final class Operations {
         }
     }
 
-    public record Operation(String name, String help, boolean regional, List<Param> params, Action action) {
+    /**
+     * An operation. {@code demoRegion} is the selection the demo uses for a regional operation, as
+     * fractions {left, top, right, bottom} of the picture (null: the centre two thirds).
+     */
+    public record Operation(String name, String help, boolean regional, List<Param> params, Action action,
+            double[] demoRegion) {
+        public Operation(String name, String help, boolean regional, List<Param> params, Action action) {
+            this(name, help, regional, params, action, null);
+        }
+
+        /** The same operation shown in the demo on another selection. */
+        public Operation withDemoRegion(double left, double top, double right, double bottom) {
+            return new Operation(name, help, regional, params, action, new double[] {left, top, right, bottom});
+        }
+
         public Param param(String name) {
             for (Param p : params) {
                 if (p.name().equals(name)) {
