@@ -92,6 +92,44 @@ public final class Engine {
 
     // ---- colour tools: hue, RGB balance, point colour, automatic adjustment, brushes, splash, lens tints ----
 
+    // Region methods take (in, mask, out, width, height, levels..., rect) like
+    // the tone adjustments: the output receives a copy of the input in which
+    // the selected pixels of the rectangle, or the whole picture for an empty
+    // rectangle, are changed. Whole-picture methods take (in, out, width,
+    // height, ...). The caller owns every array.
+
+    /**
+     * Rotates the hue by {@code level * 18} degrees (level 0 copies the input;
+     * 10 gives the opposite hue, 20 a full turn). Greys stay grey.
+     */
+    public static native void controlHue(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Hue on the 0..100 scale (50 unchanged, about 3.6 degrees a step, 0 and 100 near the opposite hue). */
+    public static native void controlHueRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /**
+     * Red, green and blue balance, each 0..20 (10 neutral). A channel's own
+     * level moves it by 6 a step and moves the other two by -3 a step, so the
+     * picture's brightness is kept: red 20 adds 60 to red and takes 30 from
+     * green and blue.
+     */
+    public static native void adjustRGB(int[] in, byte[] mask, int[] out, int width, int height, int red, int green, int blue, Rect rect);
+
+    /** Red, green and blue balance on the 0..100 scale (50 neutral, full push also 60). */
+    public static native void adjustRGBRange100(int[] in, byte[] mask, int[] out, int width, int height, int red, int green, int blue, Rect rect);
+
+    /** Keeps reds (and their orange neighbours) in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorRed(int[] in, int[] out, int width, int height);
+
+    /** Keeps greens in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorGreen(int[] in, int[] out, int width, int height);
+
+    /** Keeps blues in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorBlue(int[] in, int[] out, int width, int height);
+
+    /** Keeps yellows and oranges in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorYellow(int[] in, int[] out, int width, int height);
+
     // (end of colour tools)
 
     // ---- effects of the effect library: painterly, halftone, kaleidoscope, reflection, region, vintage ----
