@@ -1,5 +1,7 @@
-// Engine methods of the colour tools: hue, RGB balance and point colour.
+// Engine methods of the colour tools: hue, RGB balance, point colour and the
+// automatic adjustment with its settings.
 #include "bridge.h"
+#include "effect/px_color/px_auto_adjust.h"
 #include "effect/px_color/px_hue.h"
 
 // ---- region methods (in, mask, out, width, height, levels..., rect; no status)
@@ -52,3 +54,19 @@ POINT_COLOUR_METHOD(applyPointColorRed, px_point_color_red)
 POINT_COLOUR_METHOD(applyPointColorGreen, px_point_color_green)
 POINT_COLOUR_METHOD(applyPointColorBlue, px_point_color_blue)
 POINT_COLOUR_METHOD(applyPointColorYellow, px_point_color_yellow)
+
+// ---- automatic adjustment ---------------------------------------------------
+
+ENGINE_METHOD(jint, applyAutoAdjust)(JNIEnv* env, jobject, jintArray in, jintArray out, jint width, jint height) {
+  bridge::Call call(env, __func__);
+  return bridge::status(call, in, out, width, height,
+                        [&](int* src, int* dst) { return px_process_hdr(src, dst, width, height); });
+}
+
+ENGINE_METHOD(void, setAutoAdjust)(JNIEnv*, jobject, jint threshold, jint cutoff, jint weight1, jint weight2) {
+  px_set_hdr(threshold, cutoff, weight1, weight2);
+}
+ENGINE_METHOD(jint, getAutoAdjustThreshold)(JNIEnv*, jobject) { return px_get_threshold_hdr(); }
+ENGINE_METHOD(jint, getAutoAdjustCutoff)(JNIEnv*, jobject) { return px_get_cutoff_hdr(); }
+ENGINE_METHOD(jint, getAutoAdjustWeight1)(JNIEnv*, jobject) { return px_get_weight1_hdr(); }
+ENGINE_METHOD(jint, getAutoAdjustWeight2)(JNIEnv*, jobject) { return px_get_weight2_hdr(); }

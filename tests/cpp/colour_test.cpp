@@ -3,10 +3,12 @@
 // tints. Golden values are worked out by hand from the rules.
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <cstdint>
 #include <random>
 #include <vector>
 
+#include "effect/px_color/px_auto_adjust.h"
 #include "effect/px_color/px_hue.h"
 #include "log_capture.h"
 
@@ -206,4 +208,129 @@ TEST(ColourTone, RefusesHueAbove360) {
   EXPECT_EQ(px_change_colortone(&in, &out, 1, 0, 10), PX_OK);
   EXPECT_EQ(out, 12345);
   EXPECT_EQ(px_change_colortone(&in, &out, 1, 1, 360), PX_OK);
+}
+
+// ---- automatic adjustment -------------------------------------------------------
+
+TEST(AutoAdjust, LogarithmTableAndInterpolation) {
+  auto sample = [](int i) {
+    if (i <= 54) return 1024 + 2 * i;
+    if (i <= 79) return 1136 + 4 * (i - 55);
+    if (i <= 117) return 1240 + 8 * (i - 80);
+    if (i <= 181) return 1552 + 16 * (i - 118);
+    return 2592 + 32 * (i - 182);
+  };
+  for (int i = 0; i < 230; ++i) {
+    const int v = sample(i);
+    ASSERT_EQ(log_new_FIX[i], static_cast<int>(std::lround(512.0 * std::log2(v / 1024.0)))) << i;
+    ASSERT_EQ(log_interp_FIX(log_new_FIX, v), log_new_FIX[i]) << v;
+  }
+  // Between samples: a quarter of the way from 1132 to 1136.
+  EXPECT_EQ(log_interp_FIX(log_new_FIX, 1133), log_new_FIX[54] + ((log_new_FIX[55] - log_new_FIX[54]) >> 2));
+  EXPECT_EQ(log_interp_FIX(log_new_FIX, 5000), 1024);
+}
+
+TEST(AutoAdjust, NaturalLogarithmByOctaves) {
+  EXPECT_EQ(log_e_FIX_new(1), 0);
+  EXPECT_EQ(log_e_FIX_new(1024), 0);
+  EXPECT_EQ(log_e_FIX_new(2048), 1420 * 512);
+  EXPECT_EQ(log_e_FIX_new(4096), 1420 * 1024);
+  EXPECT_EQ(log_e_FIX_new(8192), 1420 * 1536);
+  EXPECT_EQ(log_e_FIX_new(16), -1420 * 512 * 6);
+  EXPECT_EQ(log_e_FIX_new(0x400000), 1420 * 1024 * 6);
+  // Cases the adjustment never passes.
+  for (int x : {0, -7, 2, 3, 4, 0x400001}) EXPECT_EQ(log_e_FIX_new(x), 21811200) << x;
+}
+
+TEST(AutoAdjust, SettingsAreCheckedOneByOne) {
+  EXPECT_EQ(px_get_threshold_hdr(), 70);
+  EXPECT_EQ(px_get_cutoff_hdr(), 100);
+  EXPECT_EQ(px_get_weight1_hdr(), 1000);
+  EXPECT_EQ(px_get_weight2_hdr(), 5120);
+  px_set_hdr(128, 101, 299, 8197);
+  px_set_hdr(-1, -1, -300, -8196);
+  EXPECT_EQ(px_get_threshold_hdr(), 70);
+  EXPECT_EQ(px_get_cutoff_hdr(), 100);
+  EXPECT_EQ(px_get_weight1_hdr(), 1000);
+  EXPECT_EQ(px_get_weight2_hdr(), 5120);
+  px_set_hdr(0, 0, 300, 8196);
+  EXPECT_EQ(px_get_threshold_hdr(), 0);
+  EXPECT_EQ(px_get_cutoff_hdr(), 0);
+  EXPECT_EQ(px_get_weight1_hdr(), 300);
+  EXPECT_EQ(px_get_weight2_hdr(), 8196);
+  px_set_hdr(70, 1000, 1000, 5120);  // cutoff 1000 is refused: stays 0
+  EXPECT_EQ(px_get_cutoff_hdr(), 0);
+  px_set_hdr(70, 100, 1000, 5120);
+}
+
+TEST(AutoAdjust, BlackStaysAndMidGreyFollowsTheCurve) {
+  std::vector<int> black(10 * 10, static_cast<int>(rgb(0, 0, 0, 0x33))), out(100, 7);
+  EXPECT_EQ(px_process_hdr(black.data(), out.data(), 10, 10), PX_OK);
+  EXPECT_EQ(out, black);
+  // Mid-grey: every pixel in bin 50, the picture counts as bright (weight
+  // 5120); the curve reaches 94 % there, so 128 becomes 239.
+  std::vector<int> grey(10 * 10, static_cast<int>(rgb(128, 128, 128, 0x80)));
+  EXPECT_EQ(px_process_hdr(grey.data(), out.data(), 10, 10), PX_OK);
+  EXPECT_EQ(out, std::vector<int>(100, static_cast<int>(rgb(239, 239, 239, 0x80))));
+  // In place gives the same.
+  EXPECT_EQ(px_process_hdr(grey.data(), grey.data(), 10, 10), PX_OK);
+  EXPECT_EQ(out, grey);
+}
+
+TEST(AutoAdjust, GainIsCappedKeepingTheHue) {
+  // Dark grey everywhere and one warm pixel at 46 %: the curve lifts it to
+  // about twice its luminance, which would push red past the top. The gain
+  // becomes 0xFF00000 / ((200 << 10) + 1) = 1305 for all three channels, so
+  // red lands just below the top (the gain is truncated).
+  std::vector<int> in(16 * 16, static_cast<int>(rgb(40, 40, 40))), out(in.size());
+  in[37] = static_cast<int>(rgb(200, 100, 50, 0x11));
+  EXPECT_EQ(px_process_hdr(in.data(), out.data(), 16, 16), PX_OK);
+  EXPECT_EQ(static_cast<uint32_t>(out[37]), rgb(254, 127, 63, 0x11));
+}
+
+TEST(AutoAdjust, LargePicturesTakeOneGlobalStep) {
+  const int w = 2000001;
+  std::vector<int> in(w, static_cast<int>(rgb(255, 255, 255, 0x7F))), out(w);
+  EXPECT_EQ(px_process_hdr(in.data(), out.data(), w, 1), PX_OK);
+  EXPECT_EQ(static_cast<uint32_t>(out[0]), rgb(245, 245, 245, 0x7F));  // brightness 9
+  EXPECT_EQ(static_cast<uint32_t>(out[w - 1]), rgb(245, 245, 245, 0x7F));
+  std::fill(in.begin(), in.end(), static_cast<int>(rgb(30, 30, 30)));
+  EXPECT_EQ(px_process_hdr(in.data(), out.data(), w, 1), PX_OK);
+  EXPECT_EQ(static_cast<uint32_t>(out[w / 2]), rgb(40, 40, 40));  // brightness 11
+  for (int i = 0; i < w; i += 2) in[i] = static_cast<int>(rgb(200, 200, 200));  // half bright: contrast 12
+  EXPECT_EQ(px_process_hdr(in.data(), out.data(), w, 1), PX_OK);
+  EXPECT_EQ(static_cast<uint32_t>(out[0]), rgb(216, 200 + 8 * 2, 216));
+  EXPECT_EQ(static_cast<uint32_t>(out[1]), rgb(30 - 10 * 2, 30 - 10 * 2, 30 - 10 * 2));
+}
+
+// ---- levels remapping ----------------------------------------------------------
+
+TEST(Levels, InputLevelsStretch) {
+  auto in_levels = [](uint32_t p, int channel, int low, int high) {
+    int in = static_cast<int>(p), out = 99;
+    changeHistogramByInput(&in, &out, 1, 1, channel, low, high);
+    return static_cast<uint32_t>(out);
+  };
+  // scale = 261120 / 150 = 1740: 50 -> 0, 125 -> 127, 200 -> 254, 201 -> 255.
+  EXPECT_EQ(in_levels(rgb(50, 125, 200, 0x44), 0, 50, 200), rgb(0, 127, 254, 0x44));
+  EXPECT_EQ(in_levels(rgb(201, 10, 255), 0, 50, 200), rgb(255, 0, 255));
+  EXPECT_EQ(in_levels(rgb(125, 125, 125), 2, 50, 200), rgb(125, 127, 125));
+  EXPECT_EQ(in_levels(rgb(125, 125, 125), 4, 50, 200), rgb(125, 125, 125));  // no channel selected
+  EXPECT_EQ(in_levels(rgb(1, 2, 3), 0, 200, 200), 99u);                     // nothing written
+}
+
+TEST(Levels, OutputLevelsSqueeze) {
+  auto out_levels = [](uint32_t p, int channel, int low, int high) {
+    int in = static_cast<int>(p), out = 99;
+    changeHistogramByOutput(&in, &out, 1, 1, channel, low, high);
+    return static_cast<uint32_t>(out);
+  };
+  // scale = 150 * 1024 / 255 = 602: 0 -> 50, 255 -> 50 + 149.
+  EXPECT_EQ(out_levels(rgb(0, 255, 128, 0x01), 0, 50, 200), rgb(50, 199, 125, 0x01));
+  EXPECT_EQ(out_levels(rgb(0, 255, 128), 1, 50, 200), rgb(50, 255, 128));
+  EXPECT_EQ(out_levels(rgb(0, 255, 128), 3, 50, 200), rgb(0, 255, 125));
+  EXPECT_EQ(out_levels(rgb(1, 2, 3), 0, 10, 5), 99u);
+  int in = 5, out = 99;
+  changeHistogramByOutput(&in, &out, 1, 0, 0, 0, 255);
+  EXPECT_EQ(out, 99);
 }

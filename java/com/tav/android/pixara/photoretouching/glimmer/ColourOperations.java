@@ -4,6 +4,7 @@ import static com.tav.android.pixara.photoretouching.glimmer.Operations.level;
 import static com.tav.android.pixara.photoretouching.glimmer.Operations.region;
 
 import com.tav.android.pixara.photoretouching.glimmer.Operations.Operation;
+import com.tav.android.pixara.photoretouching.glimmer.Operations.OperationException;
 import com.tav.android.pixara.photoretouching.glimmer.Operations.Param;
 import com.tav.android.pixara.photoretouching.jni.Engine;
 import com.tav.android.pixara.photoretouching.jni.Rect;
@@ -11,7 +12,7 @@ import com.tav.android.pixara.photoretouching.jni.Rect;
 import java.util.ArrayList;
 import java.util.List;
 
-/** Colour tools: hue, RGB balance, point colour. */
+/** Colour tools: hue, RGB balance, point colour, automatic adjustment. */
 final class ColourOperations {
     private ColourOperations() {
     }
@@ -55,6 +56,18 @@ final class ColourOperations {
         ops.add(whole("pointgreen", "Point colour: keep greens, grey elsewhere", Engine::applyPointColorGreen));
         ops.add(whole("pointblue", "Point colour: keep blues, grey elsewhere", Engine::applyPointColorBlue));
         ops.add(whole("pointyellow", "Point colour: keep yellows, grey elsewhere", Engine::applyPointColorYellow));
+        ops.add(new Operation("autoadjust", "Automatic tone correction", false, List.of(
+                new Param("threshold", 0, 127, 70, 70, "percent of bright pixels for a bright picture"),
+                new Param("cutoff", 0, 100, 100, 100, "tone curve height in percent"),
+                new Param("weight1", 300, 8196, 1000, 1000, "flattening weight of other pictures"),
+                new Param("weight2", 300, 8196, 5120, 5120, "flattening weight of bright pictures")), j -> {
+                    Engine.setAutoAdjust(j.value("threshold"), j.value("cutoff"), j.value("weight1"),
+                            j.value("weight2"));
+                    int rc = Engine.applyAutoAdjust(j.in, j.out, j.width, j.height);
+                    if (rc != Engine.SUCCESS) {
+                        throw new OperationException("autoadjust failed with result code " + rc);
+                    }
+                }));
         return ops;
     }
 }

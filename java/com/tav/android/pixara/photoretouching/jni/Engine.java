@@ -130,6 +130,40 @@ public final class Engine {
     /** Keeps yellows and oranges in colour and turns every other pixel into its grey. */
     public static native void applyPointColorYellow(int[] in, int[] out, int width, int height);
 
+    /**
+     * Automatic tone correction of the whole picture: the luminance histogram
+     * is flattened into a tone curve and every pixel is scaled to follow it,
+     * keeping its hue. Pictures above 2,000,000 pixels get one global
+     * brightness or contrast step instead. Uses the settings of
+     * {@link #setAutoAdjust}. Returns SUCCESS, ERR_NULL, or ERR_ALLOC (a work
+     * buffer could not be allocated; the output is untouched). {@code in} and
+     * {@code out} may be the same array.
+     */
+    public static native int applyAutoAdjust(int[] in, int[] out, int width, int height);
+
+    /**
+     * Sets the automatic adjustment's settings; each value outside its range
+     * is ignored and the previous one kept. threshold 0..127 (default 70): the
+     * percentage of bright pixels from which a picture counts as bright;
+     * cutoff 0..100 (default 100): the tone curve's height in percent;
+     * weight1 and weight2 300..8196 (defaults 1000 and 5120): the flattening
+     * weights of other and of bright pictures. The settings are kept for the
+     * life of the library.
+     */
+    public static native void setAutoAdjust(int threshold, int cutoff, int weight1, int weight2);
+
+    /** The automatic adjustment's bright-picture threshold (percent). */
+    public static native int getAutoAdjustThreshold();
+
+    /** The automatic adjustment's tone curve height (percent). */
+    public static native int getAutoAdjustCutoff();
+
+    /** The automatic adjustment's flattening weight for pictures that are not bright. */
+    public static native int getAutoAdjustWeight1();
+
+    /** The automatic adjustment's flattening weight for bright pictures. */
+    public static native int getAutoAdjustWeight2();
+
     // (end of colour tools)
 
     // ---- effects of the effect library: painterly, halftone, kaleidoscope, reflection, region, vintage ----

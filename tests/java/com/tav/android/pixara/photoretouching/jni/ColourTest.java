@@ -89,4 +89,52 @@ class ColourTest {
             assertArrayEquals(filled(3), untouched);
         }
     }
+
+    @Nested
+    class AutoAdjust {
+        @Test
+        void settingsAreKeptBetweenCallsAndCheckedOneByOne() {
+            assertEquals(70, Engine.getAutoAdjustThreshold());
+            assertEquals(100, Engine.getAutoAdjustCutoff());
+            assertEquals(1000, Engine.getAutoAdjustWeight1());
+            assertEquals(5120, Engine.getAutoAdjustWeight2());
+            try {
+                Engine.setAutoAdjust(128, 50, -1, 300);
+                assertEquals(70, Engine.getAutoAdjustThreshold());
+                assertEquals(50, Engine.getAutoAdjustCutoff());
+                assertEquals(1000, Engine.getAutoAdjustWeight1());
+                assertEquals(300, Engine.getAutoAdjustWeight2());
+                // A lower curve gives a darker result than the default.
+                // Mid-grey 10 x 10: the default curve takes 128 to 239.
+                int[] in = new int[100];
+                Arrays.fill(in, 0xFF808080);
+                int[] out = new int[100];
+                assertEquals(Engine.SUCCESS, Engine.applyAutoAdjust(in, out, 10, 10));
+                int low = out[0] & 255;
+                Engine.setAutoAdjust(70, 100, 1000, 5120);
+                assertEquals(Engine.SUCCESS, Engine.applyAutoAdjust(in, out, 10, 10));
+                assertEquals(0xFF, out[0] >>> 24);
+                assertEquals(239, out[0] & 255);
+                assertEquals(true, low < 239, "cutoff 50 gave " + low);
+            } finally {
+                Engine.setAutoAdjust(70, 100, 1000, 5120);
+            }
+        }
+
+        @Test
+        void badArraysAreRefused() {
+            int[] in = picture(5);
+            int[] out = filled(1);
+            assertEquals(Engine.ERR_NULL, Engine.applyAutoAdjust(null, out, W, H));
+            assertEquals(Engine.ERR_NULL, Engine.applyAutoAdjust(in, null, W, H));
+            assertEquals(Engine.ERR_NULL, Engine.applyAutoAdjust(in, new int[W * H - 1], W, H));
+            assertEquals(Engine.ERR_NULL, Engine.applyAutoAdjust(in, out, W, -1));
+            assertArrayEquals(filled(1), out);
+            int[] alpha = picture(6);
+            assertEquals(Engine.SUCCESS, Engine.applyAutoAdjust(alpha, out, W, H));
+            for (int i = 0; i < out.length; i++) {
+                assertEquals(alpha[i] >>> 24, out[i] >>> 24);
+            }
+        }
+    }
 }
