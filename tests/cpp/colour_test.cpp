@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "effect/px_color/px_auto_adjust.h"
+#include "effect/px_color/px_brush.h"
 #include "effect/px_color/px_hue.h"
 #include "log_capture.h"
 
@@ -333,4 +334,208 @@ TEST(Levels, OutputLevelsSqueeze) {
   int in = 5, out = 99;
   changeHistogramByOutput(&in, &out, 1, 0, 0, 0, 255);
   EXPECT_EQ(out, 99);
+}
+
+// ---- brushes -------------------------------------------------------------------
+
+namespace {
+std::vector<int> flat(int w, int h, uint32_t pixel) { return std::vector<int>(static_cast<size_t>(w) * h, static_cast<int>(pixel)); }
+uint32_t at(const std::vector<int>& p, int w, int x, int y) { return static_cast<uint32_t>(p[static_cast<size_t>(y) * w + x]); }
+}  // namespace
+
+TEST(Brush, LightenCentreRimAndStrengthZero) {
+  std::vector<int> img = random_picture(40, 30, 5), copy = img;
+  px_apply_lighten(img.data(), 20, 15, 40, 30, 0, 9);
+  EXPECT_EQ(img, copy);
+  // r = 8: the step 2^22 / 64 is exact, so the centre gets the full strength.
+  img = flat(40, 30, rgb(100, 100, 250, 0x66));
+  px_apply_lighten(img.data(), 20, 15, 40, 30, 50, 8);
+  EXPECT_EQ(at(img, 40, 20, 15), rgb(150, 150, 255, 0x66));
+  EXPECT_EQ(at(img, 40, 28, 15), rgb(100, 100, 250, 0x66));  // distance exactly r
+  EXPECT_EQ(at(img, 40, 20, 23), rgb(100, 100, 250, 0x66));
+  // d^2 = 16 of 64: 100 + 50 * 48 / 64.
+  EXPECT_EQ(at(img, 40, 24, 15), rgb(137, 137, 255, 0x66));
+  // Partly outside the picture: clipped, corner pixel brightened.
+  img = flat(40, 30, rgb(10, 10, 10));
+  px_apply_lighten(img.data(), 0, 0, 40, 30, 40, 8);
+  EXPECT_EQ(at(img, 40, 0, 0), rgb(50, 50, 50));
+}
+
+TEST(Brush, TheTwoDarkenFalloffsDiffer) {
+  std::vector<int> full = flat(32, 32, rgb(100, 100, 30, 0x12)), preview_form = full;
+  std::vector<int> preview(16 * 16, 0);
+  px_apply_darken(full.data(), 16, 16, 32, 32, 50, 8);
+  px_apply_darken_with_preview(preview_form.data(), 16, 16, 32, 32, preview.data(), 16, 16, 50, 8);
+  // Centre: both take the full strength.
+  EXPECT_EQ(at(full, 32, 16, 16), rgb(50, 50, 0, 0x12));
+  EXPECT_EQ(at(preview_form, 32, 16, 16), rgb(50, 50, 0, 0x12));
+  // Half way (d = 4): linear in d gives 75, quadratic in d^2 gives 62.
+  EXPECT_EQ(at(full, 32, 20, 16), rgb(75, 75, 5, 0x12));
+  EXPECT_EQ(at(preview_form, 32, 20, 16), rgb(62, 62, 0, 0x12));
+  // At the rim nothing changes.
+  EXPECT_EQ(at(full, 32, 24, 16), rgb(100, 100, 30, 0x12));
+  EXPECT_EQ(at(preview_form, 32, 16, 24), rgb(100, 100, 30, 0x12));
+  // Strength 0 leaves the quadratic form unchanged where its step 2^22 / r^2
+  // is exact; otherwise the truncated step may take one level off.
+  std::vector<int> img = random_picture(20, 20, 8), copy = img;
+  px_apply_darken_with_preview(img.data(), 9, 9, 20, 20, preview.data(), 16, 16, 0, 8);
+  EXPECT_EQ(img, copy);
+  px_apply_darken_with_preview(img.data(), 9, 9, 20, 20, preview.data(), 16, 16, 0, 7);
+  for (size_t i = 0; i < img.size(); ++i) {
+    for (int sh : {0, 8, 16}) {
+      const int a = (img[i] >> sh) & 255, b = (copy[i] >> sh) & 255;
+      ASSERT_TRUE(a == b || a == b - 1) << i;
+    }
+  }
+}
+
+TEST(Brush, PreviewIsRedrawnUnderTheBrush) {
+  std::vector<int> img = flat(16, 16, rgb(100, 100, 100)), preview(8 * 8, 0);
+  px_apply_lighten_with_preview(img.data(), 8, 8, 16, 16, preview.data(), 8, 8, 40, 3);
+  // Box 5..11 maps to preview 2..6, each sampling the picture at (2x, 2y).
+  for (int y = 0; y < 8; ++y) {
+    for (int x = 0; x < 8; ++x) {
+      const bool redrawn = x >= 2 && x <= 6 && y >= 2 && y <= 6;
+      EXPECT_EQ(static_cast<uint32_t>(preview[y * 8 + x]), redrawn ? at(img, 16, 2 * x, 2 * y) : 0u) << x << "," << y;
+    }
+  }
+  // 2^22 / 9 truncated: the centre reaches 139 rather than 140.
+  EXPECT_EQ(static_cast<uint32_t>(preview[4 * 8 + 4]), rgb(139, 139, 139));
+}
+
+TEST(Pixelize, CellsTakeTheirTopLeftPixel) {
+  std::vector<int> in = random_picture(21, 13, 9), out(in.size());
+  px_apply_pixelize(in.data(), out.data(), 21, 13, 0);
+  EXPECT_EQ(out, in);
+  px_apply_pixelize(in.data(), out.data(), 21, 13, 3);
+  for (int y = 0; y < 13; ++y) {
+    for (int x = 0; x < 21; ++x) ASSERT_EQ(at(out, 21, x, y), at(in, 21, x & ~7, y & ~7));
+  }
+  std::vector<int> same = in;
+  px_apply_pixelize(same.data(), same.data(), 21, 13, 3);
+  EXPECT_EQ(same, out);
+  px_apply_pixelize(in.data(), out.data(), 21, 13, 32);  // the whole output takes the first pixel
+  EXPECT_EQ(out, std::vector<int>(in.size(), in[0]));
+  px_apply_pixelize(in.data(), out.data(), 21, 13, 256 + 1);  // only the low byte counts
+  EXPECT_EQ(at(out, 21, 1, 1), at(in, 21, 0, 0));
+}
+
+TEST(Pixelize, RubChangesOnlyTheCellUnderTheCentre) {
+  // Shift 3, radius 3 < 8: the diamond holds one cell, (8..15, 8..15).
+  std::vector<int> img = random_picture(32, 32, 10), before = img;
+  px_rub_pixelize(img.data(), 32, 32, 3, 15, 15, 3);
+  for (int y = 0; y < 32; ++y) {
+    for (int x = 0; x < 32; ++x) {
+      const bool cell = x >= 8 && x <= 15 && y >= 8 && y <= 15;
+      ASSERT_EQ(at(img, 32, x, y), cell ? at(before, 32, 8, 8) : at(before, 32, x, y)) << x << "," << y;
+    }
+  }
+  // The box runs from the cell origin of cx - r to the cell origin of cx + r:
+  // with both in the centre cell only its origin pixel is visited.
+  img = before;
+  px_rub_pixelize(img.data(), 32, 32, 3, 12, 12, 2);
+  EXPECT_EQ(img, before);
+  // Radius 16: two cells of reach; cells at diamond distance 3 stay.
+  img = before;
+  std::vector<int> preview(16 * 16, 0);
+  px_rub_pixelize_with_preview(img.data(), 32, 32, preview.data(), 16, 16, 3, 12, 12, 16);
+  EXPECT_EQ(at(img, 32, 3, 13), at(before, 32, 0, 8));       // cell (0, 1): distance 1 + 0
+  EXPECT_EQ(at(img, 32, 17, 17), at(before, 32, 16, 16));    // cell (2, 2): distance 1 + 1
+  EXPECT_EQ(at(img, 32, 3, 27), at(before, 32, 3, 27));      // cell (0, 3): distance 3, untouched
+  EXPECT_EQ(static_cast<uint32_t>(preview[6 * 16 + 5]), at(img, 32, 10, 12));
+}
+
+// ---- colour splash -----------------------------------------------------------------
+
+TEST(Splash, SessionKeepsAndRestoresTheColour) {
+  px_finish_splash();
+  std::vector<int> img = random_picture(24, 18, 11), colour = img;
+  std::vector<int> before = img;
+  px_draw_splash(img.data(), 5, 5, 24, 18, 4);  // no session: nothing happens
+  px_recover_splash(img.data(), 24, 18);
+  EXPECT_EQ(img, before);
+
+  px_init_splash(img.data(), 24, 18);
+  ASSERT_TRUE(px_splash_active());
+  for (size_t i = 0; i < img.size(); ++i) {
+    const uint32_t c = static_cast<uint32_t>(colour[i]);
+    const uint32_t g = (((c >> 16) & 255) + 2 * ((c >> 8) & 255) + (c & 255)) >> 2;
+    ASSERT_EQ(static_cast<uint32_t>(img[i]), (c & 0xFF000000u) | g << 16 | g << 8 | g);
+  }
+  std::vector<int> grey = img, grey2(img.size());
+  px_set_gray_splash(colour.data(), grey2.data(), 24, 18);
+  EXPECT_EQ(grey2, grey);
+
+  px_draw_splash(img.data(), 10, 8, 24, 18, 3);
+  for (int y = 0; y < 18; ++y) {
+    for (int x = 0; x < 24; ++x) {
+      const bool inside = (x - 10) * (x - 10) + (y - 8) * (y - 8) < 9;
+      ASSERT_EQ(at(img, 24, x, y), inside ? at(colour, 24, x, y) : at(grey, 24, x, y)) << x << "," << y;
+    }
+  }
+  std::vector<int> other = flat(12, 9, rgb(1, 2, 3));
+  px_draw_splash(other.data(), 5, 5, 12, 9, 4);  // another size: ignored
+  px_recover_splash(other.data(), 12, 9);
+  EXPECT_EQ(other, flat(12, 9, rgb(1, 2, 3)));
+
+  std::vector<int> preview(12 * 9, 0);
+  px_draw_splash_with_preview(img.data(), 20, 14, 24, 18, preview.data(), 12, 9, 3);
+  EXPECT_EQ(at(img, 24, 20, 14), at(colour, 24, 20, 14));
+  EXPECT_EQ(static_cast<uint32_t>(preview[7 * 12 + 10]), at(colour, 24, 20, 14));
+
+  px_recover_splash(img.data(), 24, 18);
+  EXPECT_EQ(img, colour);
+
+  // A second init replaces the kept copy (the earlier one is freed).
+  px_init_splash(grey.data(), 24, 18);
+  px_recover_splash(img.data(), 24, 18);
+  EXPECT_EQ(img, grey);
+  px_finish_splash();
+  EXPECT_FALSE(px_splash_active());
+  px_recover_splash(img.data(), 24, 18);
+  EXPECT_EQ(img, grey);
+}
+
+// ---- invert and lens tints ------------------------------------------------------------
+
+TEST(Invert, RegionRuleAndNullMask) {
+  std::vector<int> in = {static_cast<int>(rgb(0, 128, 255, 0x40)), static_cast<int>(rgb(10, 20, 30))}, out(2, 5);
+  std::vector<unsigned char> mask = {0, 1};
+  EXPECT_EQ(px_apply_invert(in.data(), nullptr, out.data(), 2, 1, kWhole), PX_ERR_NULL);
+  EXPECT_EQ(out, std::vector<int>(2, 5));
+  EXPECT_EQ(px_apply_invert(in.data(), mask.data(), out.data(), 2, 1, kWhole), PX_OK);
+  EXPECT_EQ(static_cast<uint32_t>(out[0]), rgb(255, 127, 0, 0x40));
+  EXPECT_EQ(px_apply_invert(in.data(), mask.data(), out.data(), 2, 1, px_rect{0, 1, 0, 0}), PX_OK);
+  EXPECT_EQ(out[0], in[0]);
+  EXPECT_EQ(static_cast<uint32_t>(out[1]), rgb(245, 235, 225));
+}
+
+TEST(Lens, TopBandPullsTowardsTheTint) {
+  // Hue level 0: the tint is (256, 0, 0). Size 50 of 10 rows: a 5-row band.
+  std::vector<int> in = flat(4, 10, rgb(255, 255, 255, 0x70)), out(in.size());
+  EXPECT_EQ(px_control_toplens(in.data(), out.data(), 4, 10, 0, 50), PX_OK);
+  EXPECT_EQ(at(out, 4, 0, 0), rgb(255, 0, 0, 0x70));     // the border takes the tint where brighter
+  EXPECT_EQ(at(out, 4, 3, 2), rgb(255, 102, 102, 0x70)); // weight 2/5
+  EXPECT_EQ(at(out, 4, 0, 5), rgb(255, 255, 255, 0x70)); // below the band
+  EXPECT_EQ(px_control_toplens(in.data(), out.data(), 4, 10, 0, 101), PX_ERR_NULL);
+  std::vector<int> copy(in.size(), 0);
+  EXPECT_EQ(px_control_toplens(in.data(), copy.data(), 4, 10, 3, 0), PX_OK);
+  EXPECT_EQ(copy, in);
+}
+
+TEST(Lens, EdgeBandAndSizeZero) {
+  std::vector<int> in = flat(10, 10, rgb(255, 255, 255)), out(in.size());
+  EXPECT_EQ(px_control_edgelens(in.data(), out.data(), 10, 10, 0, 100), PX_OK);
+  EXPECT_EQ(at(out, 10, 0, 5), rgb(255, 0, 0));     // e = 0
+  EXPECT_EQ(at(out, 10, 9, 5), rgb(255, 51, 51));   // e = width - x = 1: weight 1/5
+  EXPECT_EQ(at(out, 10, 5, 5), rgb(255, 255, 255)); // e = 5 = band: untouched
+  // Size 0 gives a band of 0: the copy stands (no division by zero).
+  std::vector<int> copy(in.size(), 0);
+  EXPECT_EQ(px_control_edgelens(in.data(), copy.data(), 10, 10, 0, 0), PX_OK);
+  EXPECT_EQ(copy, in);
+  EXPECT_EQ(px_control_edgelens(nullptr, copy.data(), 10, 10, 0, 10), PX_ERR_NULL);
+  // Darker than the tint: a channel at or below the tint's stays.
+  in = flat(10, 10, rgb(0, 0, 0));
+  EXPECT_EQ(px_control_edgelens(in.data(), out.data(), 10, 10, 7, 100), PX_OK);
+  EXPECT_EQ(out, in);
 }

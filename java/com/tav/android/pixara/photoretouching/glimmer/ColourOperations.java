@@ -12,7 +12,7 @@ import com.tav.android.pixara.photoretouching.jni.Rect;
 import java.util.ArrayList;
 import java.util.List;
 
-/** Colour tools: hue, RGB balance, point colour, automatic adjustment. */
+/** Colour tools: hue, RGB balance, point colour, automatic adjustment, brushes, splash, pixelize, invert, lens tints. */
 final class ColourOperations {
     private ColourOperations() {
     }
@@ -68,6 +68,81 @@ final class ColourOperations {
                         throw new OperationException("autoadjust failed with result code " + rc);
                     }
                 }));
+        ops.add(brush("lighten", "Lighten brush: a few strokes across the picture", "strength", 0, 255, 60,
+                (img, x, y, r, v, w, h) -> Engine.rubLighten(img, x, y, r, v, w, h)));
+        ops.add(brush("darken", "Darken brush: a few strokes across the picture", "strength", 0, 255, 60,
+                (img, x, y, r, v, w, h) -> Engine.rubDarken(img, x, y, r, v, w, h)));
+        ops.add(brush("rubpixelize", "Pixelize brush: a few strokes across the picture", "shift", 0, 6, 3,
+                (img, x, y, r, v, w, h) -> {
+                    Engine.rubPixelize(img, x, y, r, v, w, h);
+                    return Engine.SUCCESS;
+                }));
+        ops.add(new Operation("splash", "Colour splash: grey picture, colour brought back along a stroke", false,
+                List.of(new Param("radius", 1, 2048, 60, 60, "brush radius in pixels")), j -> {
+                    System.arraycopy(j.in, 0, j.out, 0, j.in.length);
+                    check("splash", Engine.initSplash(j.out, j.width, j.height));
+                    try {
+                        for (int[] p : strokes(j)) {
+                            check("splash", Engine.drawSplash(j.out, p[0], p[1], j.value("radius"), j.width, j.height));
+                        }
+                    } finally {
+                        Engine.finishSplash();
+                    }
+                }));
+        ops.add(new Operation("pixelize", "Pixelize in cells of 2^shift pixels", false,
+                List.of(new Param("shift", 0, 8, 0, 3, "0 unchanged, 3 gives 8 x 8 cells")),
+                j -> Engine.applyPixelize(j.in, j.out, j.width, j.height, j.value("shift"))));
+        ops.add(new Operation("invert", "Invert colours", true, List.of(),
+                j -> Engine.applyInvert(j.in, j.mask, j.out, j.width, j.height, j.rect)));
+        ops.add(lens("edgelens", "Coloured band along the edges", Engine::controlEdgeLens));
+        ops.add(lens("toplens", "Coloured band down from the top", Engine::controlTopLens));
         return ops;
+    }
+
+    /** A brush method: (image, cx, cy, radius, value, width, height) -> result code. */
+    @FunctionalInterface
+    interface BrushMethod {
+        int call(int[] image, int cx, int cy, int radius, int value, int width, int height);
+    }
+
+    /** A lens method: (in, out, width, height, level, size). */
+    @FunctionalInterface
+    interface LensMethod {
+        void call(int[] in, int[] out, int width, int height, int level, int size);
+    }
+
+    /** The fixed dabs of a demo stroke: a gentle diagonal through the middle of the picture. */
+    static int[][] strokes(Operations.Job j) {
+        double[][] at = {{0.25, 0.35}, {0.35, 0.42}, {0.45, 0.48}, {0.55, 0.52}, {0.65, 0.58}, {0.75, 0.65}};
+        int[][] p = new int[at.length][];
+        for (int i = 0; i < at.length; i++) {
+            p[i] = new int[] {(int) (at[i][0] * j.width), (int) (at[i][1] * j.height)};
+        }
+        return p;
+    }
+
+    static void check(String name, int rc) throws OperationException {
+        if (rc != Engine.SUCCESS) {
+            throw new OperationException(name + " failed with result code " + rc);
+        }
+    }
+
+    static Operation brush(String name, String help, String value, int min, int max, int demo, BrushMethod m) {
+        return new Operation(name, help, false, List.of(
+                new Param(value, min, max, demo, demo, value.equals("shift") ? "cells of 2^shift pixels"
+                        : "change at the brush centre"),
+                new Param("radius", 1, 2048, 60, 60, "brush radius in pixels")), j -> {
+                    System.arraycopy(j.in, 0, j.out, 0, j.in.length);
+                    for (int[] p : strokes(j)) {
+                        check(name, m.call(j.out, p[0], p[1], j.value("radius"), j.value(value), j.width, j.height));
+                    }
+                });
+    }
+
+    static Operation lens(String name, String help, LensMethod m) {
+        return new Operation(name, help, false, List.of(
+                new Param("hue", 0, 20, 0, 12, "tint hue: level * 18 degrees"),
+                new Param("size", 0, 100, 0, 40, "band width in percent, 0 none")),
+                j -> m.call(j.in, j.out, j.width, j.height, j.value("hue"), j.value("size")));
     }
 }

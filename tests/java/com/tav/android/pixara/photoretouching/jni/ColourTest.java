@@ -137,4 +137,102 @@ class ColourTest {
             }
         }
     }
+
+    @Nested
+    class BrushesAndSplash {
+        @Test
+        void splashSessionIsKeptBetweenCalls() {
+            Engine.finishSplash();
+            int[] colour = picture(8);
+            int[] img = colour.clone();
+            assertEquals(Engine.SUCCESS, Engine.drawSplash(img, 4, 3, 3, W, H));  // no session yet
+            assertEquals(Engine.SUCCESS, Engine.recoverSplash(img, W, H));
+            assertArrayEquals(colour, img);
+            try {
+                assertEquals(Engine.SUCCESS, Engine.initSplash(img, W, H));
+                int[] grey = new int[W * H];
+                assertEquals(Engine.SUCCESS, Engine.setGrayInSplash(colour, grey, W, H));
+                assertArrayEquals(grey, img);
+                assertEquals(Engine.SUCCESS, Engine.drawSplash(img, 4, 3, 2, W, H));
+                assertEquals(colour[3 * W + 4], img[3 * W + 4]);
+                assertEquals(grey[0], img[0]);
+                int[] preview = new int[(W / 2) * (H / 2)];
+                assertEquals(Engine.SUCCESS, Engine.drawSplashPreview(img, preview, 0, 0, 2, W, H, W / 2, H / 2));
+                assertEquals(colour[0], img[0]);
+                assertEquals(colour[0], preview[0]);
+                assertEquals(Engine.SUCCESS, Engine.recoverSplash(img, W, H));
+                assertArrayEquals(colour, img);
+                // A second start replaces the kept picture.
+                assertEquals(Engine.SUCCESS, Engine.initSplash(grey.clone(), W, H));
+                assertEquals(Engine.SUCCESS, Engine.recoverSplash(img, W, H));
+                assertArrayEquals(grey, img);
+            } finally {
+                Engine.finishSplash();
+            }
+            int[] after = picture(9);
+            assertEquals(Engine.SUCCESS, Engine.recoverSplash(after, W, H));
+            assertArrayEquals(picture(9), after);
+        }
+
+        @Test
+        void brushesRefuseBadArrays() {
+            int[] img = filled(0xFF646464);
+            int[] preview = new int[4];
+            assertEquals(Engine.ERR_NULL, Engine.rubLighten(null, 3, 3, 2, 50, W, H));
+            assertEquals(Engine.ERR_NULL, Engine.rubDarken(new int[W * H - 1], 3, 3, 2, 50, W, H));
+            assertEquals(Engine.ERR_NULL, Engine.rubLightenPreview(img, null, 3, 3, 2, 50, W, H, 2, 2));
+            assertEquals(Engine.ERR_NULL, Engine.rubDarkenPreview(img, preview, 3, 3, 2, 50, W, H, 3, 2));
+            assertEquals(Engine.ERR_NULL, Engine.rubDarkenPreview(img, preview, 3, 3, 2, 50, W, H, 0, 2));
+            assertEquals(Engine.ERR_NULL, Engine.initSplash(img, W, 0));
+            assertEquals(Engine.ERR_NULL, Engine.drawSplashPreview(img, null, 3, 3, 2, W, H, 2, 2));
+            assertEquals(Engine.ERR_NULL, Engine.setGrayInSplash(img, new int[1], W, H));
+            Engine.rubPixelize(new int[5], 3, 3, 8, 1, W, H);
+            Engine.rubPixelizePreview(img, new int[1], 3, 3, 8, 1, W, H, 2, 2);
+            assertArrayEquals(filled(0xFF646464), img);
+        }
+
+        @Test
+        void brushesChangeTheImageInPlace() {
+            int[] img = filled(0x33646464);
+            assertEquals(Engine.SUCCESS, Engine.rubLighten(img, 4, 3, 2, 50, W, H));
+            assertEquals(0x33969696, img[3 * W + 4]);
+            assertEquals(0x33646464, img[3 * W + 6]);
+            assertEquals(Engine.SUCCESS, Engine.rubDarken(img, 4, 3, 2, 50, W, H));
+            assertEquals(0x33646464, img[3 * W + 4]);
+            int[] preview = new int[4 * 3];
+            assertEquals(Engine.SUCCESS, Engine.rubDarkenPreview(img, preview, 4, 3, 2, 100, W, H, 4, 3));
+            assertEquals(0x33000000, img[3 * W + 4]);
+            assertEquals(img[0], preview[0]);
+            int[] pix = picture(12);
+            int[] before = pix.clone();
+            Engine.rubPixelize(pix, 1, 1, 1, 1, W, H);
+            assertEquals(before[0], pix[W + 1]);
+            int[] out = new int[W * H];
+            Engine.applyPixelize(before, out, W, H, 1);
+            assertEquals(before[2 * W + 2], out[3 * W + 3]);
+        }
+
+        @Test
+        void invertAndLenses() {
+            int[] in = filled(0x11203040);
+            int[] out = new int[W * H];
+            Engine.applyInvert(in, null, out, W, H, Rect.whole());  // the mask is required
+            assertArrayEquals(new int[W * H], out);
+            byte[] mask = new byte[W * H];
+            mask[5] = 1;
+            Engine.applyInvert(in, mask, out, W, H, new Rect(0, 0, W - 1, 0));
+            assertEquals(0x11DFCFBF, out[5]);
+            assertEquals(0x11203040, out[4]);
+            int[] white = filled(0xFFFFFFFF);
+            Engine.controlTopLens(white, out, W, H, 0, 50);  // rows 0..2
+            assertEquals(0xFFFF0000, out[0]);
+            assertEquals(0xFFFFFFFF, out[3 * W]);
+            int[] keep = filled(4);
+            Engine.controlEdgeLens(white, keep, W, H, 0, 101);  // size above 100: nothing written
+            Engine.controlEdgeLens(null, keep, W, H, 0, 10);
+            assertArrayEquals(filled(4), keep);
+            Engine.controlEdgeLens(white, keep, W, H, 0, 0);
+            assertArrayEquals(white, keep);
+        }
+    }
 }
