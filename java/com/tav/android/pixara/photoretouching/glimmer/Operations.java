@@ -170,6 +170,7 @@ public final class Operations {
         // One line an area; each area's class lists its own operations.
         ops.addAll(ToneOperations.list());
         // colour tools
+        ops.addAll(ColourOperations.list());
 
         // effects
 

@@ -92,6 +92,162 @@ public final class Engine {
 
     // ---- colour tools: hue, RGB balance, point colour, automatic adjustment, brushes, splash, lens tints ----
 
+    // Region methods take (in, mask, out, width, height, levels..., rect) like
+    // the tone adjustments: the output receives a copy of the input in which
+    // the selected pixels of the rectangle, or the whole picture for an empty
+    // rectangle, are changed. Whole-picture methods take (in, out, width,
+    // height, ...). The caller owns every array.
+
+    /**
+     * Rotates the hue by {@code level * 18} degrees (level 0 copies the input;
+     * 10 gives the opposite hue, 20 a full turn). Greys stay grey.
+     */
+    public static native void controlHue(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Hue on the 0..100 scale (50 unchanged, about 3.6 degrees a step, 0 and 100 near the opposite hue). */
+    public static native void controlHueRange100(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /**
+     * Red, green and blue balance, each 0..20 (10 neutral). A channel's own
+     * level moves it by 6 a step and moves the other two by -3 a step, so the
+     * picture's brightness is kept: red 20 adds 60 to red and takes 30 from
+     * green and blue.
+     */
+    public static native void adjustRGB(int[] in, byte[] mask, int[] out, int width, int height, int red, int green, int blue, Rect rect);
+
+    /** Red, green and blue balance on the 0..100 scale (50 neutral, full push also 60). */
+    public static native void adjustRGBRange100(int[] in, byte[] mask, int[] out, int width, int height, int red, int green, int blue, Rect rect);
+
+    /** Keeps reds (and their orange neighbours) in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorRed(int[] in, int[] out, int width, int height);
+
+    /** Keeps greens in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorGreen(int[] in, int[] out, int width, int height);
+
+    /** Keeps blues in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorBlue(int[] in, int[] out, int width, int height);
+
+    /** Keeps yellows and oranges in colour and turns every other pixel into its grey. */
+    public static native void applyPointColorYellow(int[] in, int[] out, int width, int height);
+
+    /**
+     * Automatic tone correction of the whole picture: the luminance histogram
+     * is flattened into a tone curve and every pixel is scaled to follow it,
+     * keeping its hue. Pictures above 2,000,000 pixels get one global
+     * brightness or contrast step instead. Uses the settings of
+     * {@link #setAutoAdjust}. Returns SUCCESS, ERR_NULL, or ERR_ALLOC (a work
+     * buffer could not be allocated; the output is untouched). {@code in} and
+     * {@code out} may be the same array.
+     */
+    public static native int applyAutoAdjust(int[] in, int[] out, int width, int height);
+
+    /**
+     * Sets the automatic adjustment's settings; each value outside its range
+     * is ignored and the previous one kept. threshold 0..127 (default 70): the
+     * percentage of bright pixels from which a picture counts as bright;
+     * cutoff 0..100 (default 100): the tone curve's height in percent;
+     * weight1 and weight2 300..8196 (defaults 1000 and 5120): the flattening
+     * weights of other and of bright pictures. The settings are kept for the
+     * life of the library.
+     */
+    public static native void setAutoAdjust(int threshold, int cutoff, int weight1, int weight2);
+
+    /** The automatic adjustment's bright-picture threshold (percent). */
+    public static native int getAutoAdjustThreshold();
+
+    /** The automatic adjustment's tone curve height (percent). */
+    public static native int getAutoAdjustCutoff();
+
+    /** The automatic adjustment's flattening weight for pictures that are not bright. */
+    public static native int getAutoAdjustWeight1();
+
+    /** The automatic adjustment's flattening weight for bright pictures. */
+    public static native int getAutoAdjustWeight2();
+
+    // Brushes change the full-size image in place, one call per touch. Their
+    // arguments come in one order: (image, [preview,] cx, cy, radius,
+    // strength or cell shift, width, height[, previewWidth, previewHeight]).
+    // The brush covers the pixels strictly closer than radius to (cx, cy).
+    // A preview is a smaller copy of the image with the same aspect ratio;
+    // the preview forms also redraw the part of it under the brush. The
+    // status-returning brush methods give SUCCESS, or ERR_NULL for a null or
+    // too short array or a size that is not positive (nothing is changed).
+
+    /** Lightens under the brush by up to {@code strength} at the centre, nothing at the rim; never darkens. */
+    public static native int rubLighten(int[] image, int cx, int cy, int radius, int strength, int width, int height);
+
+    /** Darkens under the brush by up to {@code strength}, falling off linearly with the distance. */
+    public static native int rubDarken(int[] image, int cx, int cy, int radius, int strength, int width, int height);
+
+    /** {@link #rubLighten} that also redraws the preview under the brush. */
+    public static native int rubLightenPreview(int[] image, int[] preview, int cx, int cy, int radius, int strength, int width, int height, int previewWidth, int previewHeight);
+
+    /**
+     * Darkens under the brush with the lighten brush's softer falloff (in the
+     * squared distance) and redraws the preview; never lightens.
+     */
+    public static native int rubDarkenPreview(int[] image, int[] preview, int cx, int cy, int radius, int strength, int width, int height, int previewWidth, int previewHeight);
+
+    /**
+     * Pixelizes the whole picture in square cells of {@code 2^shift} pixels,
+     * each taking its top-left pixel (shift 0 copies).
+     */
+    public static native void applyPixelize(int[] in, int[] out, int width, int height, int shift);
+
+    /**
+     * Pixelizes, in place, the cells of {@code 2^shift} pixels within
+     * {@code radius >> shift} cells (diamond distance) of the cell under
+     * (cx, cy).
+     */
+    public static native void rubPixelize(int[] image, int cx, int cy, int radius, int shift, int width, int height);
+
+    /** {@link #rubPixelize} that also redraws the preview. */
+    public static native void rubPixelizePreview(int[] image, int[] preview, int cx, int cy, int radius, int shift, int width, int height, int previewWidth, int previewHeight);
+
+    /**
+     * Starts a colour splash: the library keeps a copy of the colour picture
+     * and the picture turns grey in place. A second call replaces the kept
+     * copy. End the session with {@link #finishSplash}. Returns SUCCESS or
+     * ERR_NULL.
+     */
+    public static native int initSplash(int[] image, int width, int height);
+
+    /** Writes the splash grey, (R + 2G + B) / 4, of {@code in} to {@code out}. Returns SUCCESS or ERR_NULL. */
+    public static native int setGrayInSplash(int[] in, int[] out, int width, int height);
+
+    /**
+     * Brings the kept colour back under the brush. Does nothing before
+     * {@link #initSplash} or for a picture of another size. Returns SUCCESS
+     * or ERR_NULL.
+     */
+    public static native int drawSplash(int[] image, int cx, int cy, int radius, int width, int height);
+
+    /** {@link #drawSplash} that also redraws the preview. */
+    public static native int drawSplashPreview(int[] image, int[] preview, int cx, int cy, int radius, int width, int height, int previewWidth, int previewHeight);
+
+    /** Restores the whole kept colour picture (nothing without a session of this size). Returns SUCCESS or ERR_NULL. */
+    public static native int recoverSplash(int[] image, int width, int height);
+
+    /** Ends the colour splash session and frees the kept copy. */
+    public static native void finishSplash();
+
+    /**
+     * Inverts the colour of the selected pixels (every pixel for an empty
+     * rectangle). The mask must not be null, even for an empty rectangle.
+     */
+    public static native void applyInvert(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /**
+     * Tints a band along the picture's edges towards the hue {@code level * 18}
+     * degrees (0..20), strongest at the border; only where the picture is
+     * brighter than the tint. size 0..100: the band's width in percent of half
+     * the longer side. A size above 100 does nothing.
+     */
+    public static native void controlEdgeLens(int[] in, int[] out, int width, int height, int level, int size);
+
+    /** As {@link #controlEdgeLens} for a band down from the top; size in percent of the height. */
+    public static native void controlTopLens(int[] in, int[] out, int width, int height, int level, int size);
+
     // (end of colour tools)
 
     // ---- effects of the effect library: painterly, halftone, kaleidoscope, reflection, region, vintage ----

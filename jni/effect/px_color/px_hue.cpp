@@ -1,0 +1,196 @@
+// Hue rotation, RGB balance, point colour and colour tone. Each is a small
+// pixel function built once per call; the region and whole-picture forms
+// only differ in which pixels they visit.
+#include "px_hue.h"
+
+#include <array>
+#include <cstdint>
+#include <cstring>
+
+#include "px_fixed.h"
+#include "px_region.h"
+
+const int LUT_HueValue_Range100[101] = {
+    180, 183, 187, 190, 194, 197, 201, 205, 208, 212, 215, 219, 223, 226, 230, 233, 237, 241, 244, 248, 251,
+    255, 259, 262, 266, 269, 273, 277, 280, 284, 287, 291, 295, 298, 302, 305, 309, 313, 316, 320, 323, 327,
+    331, 334, 338, 341, 345, 349, 352, 356, 0,   3,   7,   10,  14,  17,  21,  25,  28,  32,  35,  39,  43,
+    46,  50,  53,  57,  61,  64,  68,  71,  75,  79,  82,  86,  89,  93,  97,  100, 104, 107, 111, 115, 118,
+    122, 125, 129, 133, 136, 140, 143, 147, 151, 154, 158, 161, 165, 169, 172, 176, 179};
+
+namespace {
+
+inline void unpack(uint32_t p, int* r, int* g, int* b) {
+  *r = static_cast<int>((p >> 16) & 255);
+  *g = static_cast<int>((p >> 8) & 255);
+  *b = static_cast<int>(p & 255);
+}
+
+// ---- hue -------------------------------------------------------------------
+
+// The HSV sector px_hsv2rgb would use for h (h = 360 is sector 0); the product
+// wraps in 32 bits as on the target.
+inline int hue_sector(int h) {
+  if (h == 360) return 0;
+  return static_cast<int32_t>(static_cast<uint32_t>(h) * 1092u) >> 16;
+}
+
+struct HueShift {
+  int shift;
+  uint32_t operator()(uint32_t p) const {
+    int r, g, b, h, s, v;
+    unpack(p, &r, &g, &b);
+    px_rgb2hsv(r, g, b, &h, &s, &v);
+    if (s == 0) return p;  // grey stays grey
+    int h2 = static_cast<int>(static_cast<uint32_t>(h) + static_cast<uint32_t>(shift));
+    if (h2 < 0) {
+      h2 += 360;
+    } else if (h2 > 359) {
+      h2 -= 360;
+    }
+    const int sector = hue_sector(h2);
+    if (sector < 0 || sector > 5) return p;
+    px_hsv2rgb(h2, s, v, &r, &g, &b);
+    return px_argb(p, r, g, b);
+  }
+};
+
+int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, int shift, px_rect rect) {
+  if (!in || !out) return PX_ERR_NULL;
+  if (shift == 0) {
+    if (in != out && width > 0 && height > 0) {
+      std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    }
+    return PX_OK;
+  }
+  px_region_map(in, mask, out, width, height, rect, HueShift{shift});
+  return PX_OK;
+}
+
+// ---- RGB balance -----------------------------------------------------------
+
+struct Balance {
+  int dr, dg, db;  // offsets added to R, G, B; they sum to zero
+  static int channel(int c, int d) {
+    int v = c + d;
+    return v >= 256 ? 255 : (v < 0 ? 0 : v);
+  }
+  uint32_t operator()(uint32_t p) const {
+    int r, g, b;
+    unpack(p, &r, &g, &b);
+    return static_cast<uint32_t>(
+        px_pack_rgb888(static_cast<int>(p), channel(r, dr), channel(g, dg), channel(b, db)));
+  }
+};
+
+Balance balance_of(int red, int green, int blue) {
+  const int dr = red - 10, dg = green - 10, db = blue - 10;
+  return {6 * dr - 3 * dg - 3 * db, 6 * dg - 3 * dr - 3 * db, 6 * db - 3 * dr - 3 * dg};
+}
+
+Balance balance_of_range100(int red, int green, int blue) {
+  // Steps of 0.6 in single precision, truncated.
+  const int dr = static_cast<int>(static_cast<float>(red - 50) * 0.6f);
+  const int dg = static_cast<int>(static_cast<float>(green - 50) * 0.6f);
+  const int db = static_cast<int>(static_cast<float>(blue - 50) * 0.6f);
+  return {2 * dr - dg - db, 2 * dg - dr - db, 2 * db - dr - dg};
+}
+
+// ---- point colour ----------------------------------------------------------
+
+// Luma/chroma with integer weights (arithmetic shifts), as the tone
+// adjustments use it.
+struct Ycc {
+  int y, cb, cr;
+};
+inline Ycc to_ycc(int r, int g, int b) {
+  return {(77 * r + 150 * g + 29 * b) >> 8, (-43 * r - 85 * g + 128 * b) >> 8, (128 * r - 107 * g - 21 * b) >> 8};
+}
+
+template <class Keep>
+struct PointColour {
+  Keep keep;
+  uint32_t operator()(uint32_t p) const {
+    int r, g, b;
+    unpack(p, &r, &g, &b);
+    const Ycc v = to_ycc(r, g, b);
+    if (!keep(v.cb, v.cr)) return px_argb(p, v.y, v.y, v.y);
+    return px_argb(p, px_clamp255(v.y + ((v.cr * 359) >> 8)), px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)),
+                   px_clamp255(v.y + ((v.cb * 454) >> 8)));
+  }
+};
+
+template <class Keep>
+void point_colour(int* in, int* out, int width, int height, Keep keep) {
+  if (!in || !out) return;
+  px_map_pixels(in, out, width, height, PointColour<Keep>{keep});
+}
+
+// ---- colour tone -----------------------------------------------------------
+
+// The tinted colour depends only on the pixel's value (its largest channel).
+struct ColourTone {
+  std::array<uint32_t, 256> rgb;
+  uint32_t operator()(uint32_t p) const {
+    uint32_t m = (p >> 16) & 255, g = (p >> 8) & 255, b = p & 255;
+    if (g > m) m = g;
+    if (b > m) m = b;
+    return (p & 0xFF000000u) | rgb[m];
+  }
+};
+
+}  // namespace
+
+int px_control_hue(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
+  return rotate_hue(in, mask, out, width, height, static_cast<int>(static_cast<uint32_t>(level) * 18u), rect);
+}
+
+int px_control_hue_range100(int* in, unsigned char* mask, int* out, int width, int height, int level,
+                            px_rect rect) {
+  // Levels outside the scale take its nearest end rather than reading past
+  // the table.
+  const int i = level < 0 ? 0 : (level > 100 ? 100 : level);
+  return rotate_hue(in, mask, out, width, height, LUT_HueValue_Range100[i], rect);
+}
+
+void px_adjust_RGB(int* in, unsigned char* mask, int* out, int width, int height, int red, int green, int blue,
+                   px_rect rect) {
+  px_region_map(in, mask, out, width, height, rect, balance_of(red, green, blue));
+}
+
+void px_adjust_RGB_range100(int* in, unsigned char* mask, int* out, int width, int height, int red, int green,
+                            int blue, px_rect rect) {
+  px_region_map(in, mask, out, width, height, rect, balance_of_range100(red, green, blue));
+}
+
+void px_adjust_RGB_all(int* in, int* out, int width, int height, int red, int green, int blue) {
+  px_map_pixels(in, out, width, height, balance_of(red, green, blue));
+}
+
+void px_point_color_red(int* in, int* out, int width, int height) {
+  point_colour(in, out, width, height, [](int cb, int cr) { return cr >= 1 && cb < 0 && cr >= -cb; });
+}
+void px_point_color_yellow(int* in, int* out, int width, int height) {
+  point_colour(in, out, width, height, [](int cb, int cr) { return cr >= 1 && cb < 0 && cr <= -cb; });
+}
+void px_point_color_green(int* in, int* out, int width, int height) {
+  point_colour(in, out, width, height, [](int cb, int cr) { return cb < 0 && cr < 0; });
+}
+void px_point_color_blue(int* in, int* out, int width, int height) {
+  point_colour(in, out, width, height, [](int cb, int cr) { return cb >= 1 && cr < 0; });
+}
+
+int px_change_colortone(int* in, int* out, int width, int height, int hue) {
+  if (!in || !out || hue > 360) return PX_ERR_NULL;
+  if (height < 1) return PX_OK;
+  ColourTone tone{};
+  for (int v = 0; v < 256; ++v) {
+    // v/2 + v^2/256: darker below 128, brighter above.
+    int lifted = (50 * v + (v * v * 50) / 128) / 100;
+    lifted = lifted > 255 ? 255 : lifted;
+    int r, g, b;
+    px_hsv2rgb(hue, 19660, lifted, &r, &g, &b);
+    tone.rgb[v] = static_cast<uint32_t>(px_pack_rgb888(0, r, g, b));
+  }
+  px_map_pixels(in, out, width, height, tone);
+  return PX_OK;
+}
