@@ -53,7 +53,7 @@ struct Argb {
   uint32_t at(int x, int y) const { return out[static_cast<size_t>(y) * w + x]; }
 };
 
-[[maybe_unused]] uint32_t grey(uint32_t v, uint32_t alpha = 0xFF) { return alpha << 24 | v << 16 | v << 8 | v; }
+uint32_t grey(uint32_t v, uint32_t alpha = 0xFF) { return alpha << 24 | v << 16 | v << 8 | v; }
 }  // namespace
 
 // ---- painterly ------------------------------------------------------------------
@@ -305,4 +305,249 @@ TEST(Painterly, DispatcherReachesEachEffectAndRefusesOtherFormatsCleanly) {
     structIELImage a{16, 12, IEL_FORMAT_TYPE4, planar.data()}, b{16, 12, IEL_FORMAT_TYPE4, planar_out.data()};
     EXPECT_EQ(IEL_Apply_Effect(&a, &b, &p), IEL_ERR_FORMAT) << effect;
   }
+}
+
+// ---- region effects ------------------------------------------------------------
+
+TEST(Region, TouchNearTheBorderIsAnalysedAsDark) {
+  Argb bright(8, 8, grey(200));
+  EXPECT_EQ(IEL_AnalyseIntensity_ARGB8888(1, 1, &bright.a), 0);
+  EXPECT_EQ(IEL_AnalyseIntensity_ARGB8888(6, 3, &bright.a), 0);  // x >= width - 2
+  EXPECT_EQ(IEL_AnalyseIntensity_ARGB8888(2, 2, &bright.a), 1);
+  // A mean intensity of exactly 128 counts as bright, 127 as dark.
+  Argb mid(8, 8, 0xFF800080u | 128 << 8);  // (128 + 128 + 2 * 128) / 4
+  EXPECT_EQ(IEL_AnalyseIntensity_ARGB8888(4, 4, &mid.a), 1);
+  Argb below(8, 8, grey(127));
+  EXPECT_EQ(IEL_AnalyseIntensity_ARGB8888(4, 4, &below.a), 0);
+}
+
+TEST(Region, BrightnessChangesTheTouchedHalfAndFeathersItsEdge) {
+  Argb im(6, 1);
+  im.in = {grey(97, 0x10), grey(98), grey(110), grey(200), grey(128), grey(158)};
+  ASSERT_EQ(IEL_RegionBrightness_ARGB8888(&im.a, &im.b, 1, 40), IEL_OK);
+  EXPECT_EQ(im.out[0], grey(97));                            // kept, made opaque
+  EXPECT_EQ(im.out[1], grey((1 * 200 + 128 * 98) >> 7));     // feather[29] = 1
+  EXPECT_EQ(im.out[2], grey((24 * 200 + 128 * 110) >> 7));   // feather[127 - 110] = 24
+  EXPECT_EQ(im.out[3], grey(255));                           // 200 + 200 clamped
+  ASSERT_EQ(IEL_RegionBrightness_ARGB8888(&im.a, &im.b, 0, -10), IEL_OK);
+  EXPECT_EQ(im.out[0], grey(47));                            // dark half: 97 - 50
+  EXPECT_EQ(im.out[4], grey(std::max(0, (126 * -50 + 128 * 128) >> 7)));  // feather[0]
+  EXPECT_EQ(im.out[5], grey(158));                           // above 157: kept
+}
+
+TEST(Region, ContrastStretchesOneHalfWithoutCrossingMidGrey) {
+  Argb im(5, 1);
+  im.in = {grey(200), grey(128), grey(50), grey(127), grey(130)};
+  ASSERT_EQ(IEL_VariableContrast_ARGB8888(&im.a, &im.b, 1, 2), IEL_OK);
+  EXPECT_EQ(im.out[0], grey(200 + 8 * 2));  // step[200] = 8
+  EXPECT_EQ(im.out[1], grey(128));          // below 129: kept
+  ASSERT_EQ(IEL_VariableContrast_ARGB8888(&im.a, &im.b, 1, -10), IEL_OK);
+  EXPECT_EQ(im.out[4], grey(128));          // 130 - 10 stops at 128
+  ASSERT_EQ(IEL_VariableContrast_ARGB8888(&im.a, &im.b, 0, 3), IEL_OK);
+  EXPECT_EQ(im.out[2], grey(50 - 8 * 3));   // step[50] = -8
+  EXPECT_EQ(im.out[3], grey(124));
+  EXPECT_EQ(im.out[0], grey(200));
+}
+
+TEST(Region, ExposureLevelsAndFactors) {
+  LogCapture log;
+  Argb im(3, 1);
+  im.in = {grey(200), grey(128), grey(50)};
+  EXPECT_EQ(IEL_VariableExposure_ARGB8888(&im.a, &im.b, 1, 8), IEL_ERR_NULL);
+  EXPECT_TRUE(log.contains("Max allowed level is : +/- 7. Passed: 8 \n"));
+  EXPECT_EQ(im.out[0], 0x12345678u);
+  ASSERT_EQ(IEL_VariableExposure_ARGB8888(&im.a, &im.b, 1, 2), IEL_OK);
+  EXPECT_EQ(im.out[0], grey(200 * (8 * 10 + 512) >> 9));
+  EXPECT_EQ(im.out[1], grey(128));
+  EXPECT_EQ(im.out[2], grey(50));
+  ASSERT_EQ(IEL_VariableExposure_ARGB8888(&im.a, &im.b, 0, 2), IEL_OK);  // E = -10
+  EXPECT_EQ(im.out[2], grey(50 * (-8 * -10 + 512) >> 9));
+}
+
+TEST(Region, DispatcherAnalysesTheTouchPoint) {
+  Argb im(9, 9, grey(60));
+  int32_t level = 4;
+  structIELEffectParams p{IEL_EFFECT_REGION_BRIGHTNESS, &level, nullptr, 4, 4};
+  ASSERT_EQ(IEL_Apply_Effect(&im.a, &im.b, &p), IEL_OK);
+  EXPECT_EQ(im.out[0], grey(80));  // dark touched, dark pixels lifted by 5 * 4
+  p.effect = IEL_EFFECT_REGION_EXPOSURE;
+  level = -8;
+  EXPECT_EQ(IEL_Apply_Effect(&im.a, &im.b, &p), IEL_ERR_NULL);
+}
+
+// ---- reflection ---------------------------------------------------------------
+
+TEST(Reflection, HeightChecks) {
+  LogCapture log;
+  Argb im(4, 201);
+  EXPECT_EQ(IEL_ReflectionEffect(&im.a, &im.b, 100), IEL_ERR_NULL);
+  EXPECT_TRUE(log.contains("Invalid Reflection Height(100) Height(201) \n"));
+  Argb same(4, 100);
+  EXPECT_EQ(IEL_ReflectionEffect(&same.a, &same.b, 100), IEL_ERR_NULL);
+  Argb half(4, 200);
+  EXPECT_EQ(IEL_ReflectionEffect(&half.a, &half.b, 100), IEL_OK);
+}
+
+TEST(Reflection, MirrorRowsFadeToTheLastRow) {
+  // Height 200, reflection height 100: output row 100 + i is input row
+  // 100 - i with f = 819 + (-819 * i / 100); the last row (i = 99) mirrors
+  // row 1 with f = 819 - 810 = 9 (the quotient is truncated before the
+  // subtraction).
+  Argb im(3, 200);
+  for (int y = 0; y < 200; ++y)
+    for (int x = 0; x < 3; ++x) im.in[y * 3 + x] = 0x40000000u | (y << 8) | x;
+  im.in[1 * 3 + 0] = 0x40FFFFFFu;
+  im.in[100 * 3 + 1] = 0x00FF0000u;
+  ASSERT_EQ(IEL_ReflectionEffect(&im.a, &im.b, 100), IEL_OK);
+  for (int y = 0; y < 100; ++y) ASSERT_EQ(im.out[y * 3 + 2], im.in[y * 3 + 2]) << y;
+  EXPECT_EQ(im.at(0, 199), grey(255 * 9 >> 10));  // white: Y = 255, Y' = 2
+  // Row 100 mirrors itself at f = 819: pure red, Y = 76, Y' = 60, each
+  // channel moves by -16.
+  EXPECT_EQ(im.at(1, 100), 0xFFEF0000u);
+  EXPECT_EQ(im.at(2, 150) & 0xFF000000u, 0xFF000000u);
+}
+
+TEST(Reflection, PlanarLayoutFadesBrightnessInRowPairsAndOtherFormatsAreUntouched) {
+  const int w = 4, h = 8, rh = 4;
+  std::vector<unsigned char> in(w * h * 3 / 2), out(in.size(), 0);
+  for (size_t i = 0; i < in.size(); ++i) in[i] = 200;
+  for (int x = 0; x < w; ++x) in[1 * w + x] = 100;  // brightness row 1
+  structIELImage a{w, h, IEL_FORMAT_TYPE4, in.data()}, b{w, h, IEL_FORMAT_TYPE4, out.data()};
+  ASSERT_EQ(IEL_ReflectionEffect(&a, &b, rh), IEL_OK);
+  EXPECT_EQ(out[4 * w], 200 * 819 >> 10);                   // row 4 <- row 4, f = 819
+  EXPECT_EQ(out[5 * w], 200 * 819 >> 10);                   // row 5 <- row 3, same pair
+  EXPECT_EQ(out[7 * w], 100 * (819 - 1638 * 1 / 4) >> 10);  // row 7 <- row 1, second pair
+  EXPECT_EQ(out[w * h + 3 * w], 200);                       // colour rows mirrored as they are
+
+  Rgb rgb(2, 3);
+  ASSERT_EQ(IEL_ReflectionEffect(&rgb.a, &rgb.b, 2), IEL_OK);
+  for (unsigned char v : rgb.out) ASSERT_EQ(v, 0xAB);
+}
+
+// ---- kaleidoscope ------------------------------------------------------------------
+
+TEST(Kaleidoscope, EightFoldMirrorOnWhite) {
+  Argb im(22, 13);
+  im.random(4);
+  ASSERT_EQ(IEL_TriMirrorKaliedoscope_ARGB888(&im.a, &im.b), IEL_OK);
+  // m = 13, S = 12, square from column (22 - 13) / 2 = 4 -> 4, rows 0..11.
+  const int S = 12, x0 = 4;
+  for (int y = 0; y < 13; ++y) {
+    for (int x = 0; x < 22; ++x) {
+      if (y >= S || x < x0 || x >= x0 + S) {
+        ASSERT_EQ(im.at(x, y), 0xFFFFFFFFu) << x << "," << y;
+      }
+    }
+  }
+  for (int r = 0; r < S; ++r) {
+    for (int c = 0; c < S; ++c) {
+      EXPECT_EQ(im.at(x0 + c, r), im.at(x0 + S - 1 - c, r));  // left-right mirror
+      EXPECT_EQ(im.at(x0 + c, r), im.at(x0 + c, S - 1 - r));  // top-bottom mirror
+      EXPECT_EQ(im.at(x0 + c, r), im.at(x0 + r, c));          // diagonal mirror
+    }
+  }
+  // The corner shows the source region's corner: (11 - 3) & ~3 = 8, (6 - 3) & ~3 = 0.
+  EXPECT_EQ(im.at(x0, 0), im.in[0 * 22 + 8]);
+  // Every pattern pixel comes from the centred source region.
+  for (int r = 0; r < S; ++r) {
+    for (int c = 0; c < S; ++c) {
+      bool found = false;
+      for (int y = 0; y <= 8 && !found; ++y)
+        for (int x = 8; x <= 16 && !found; ++x) found = im.in[y * 22 + x] == im.at(x0 + c, r);
+      ASSERT_TRUE(found) << c << "," << r;
+    }
+  }
+}
+
+TEST(Kaleidoscope, NeedsArgb) {
+  LogCapture log;
+  Rgb im(8, 8);
+  structIELEffectParams p{IEL_EFFECT_KALEIDOSCOPE, nullptr, nullptr, 0, 0};
+  EXPECT_EQ(IEL_Apply_Effect(&im.a, &im.b, &p), IEL_ERR_FORMAT);
+  EXPECT_TRUE(log.contains("Return code is:  4 \n"));
+}
+
+// ---- halftone -----------------------------------------------------------------------
+
+TEST(Halftone, SeparationOfBlackRedAndWhite) {
+  const unsigned char rgb[9] = {0, 0, 0, 255, 0, 0, 255, 255, 255};
+  unsigned char c[3], m[3], y[3], k[3];
+  IEL_Halftone_RGBtoCMYKconversion(rgb, 3, 1, c, m, y, k);
+  EXPECT_EQ((Bytes{c[0], m[0], y[0], k[0]}), (Bytes{1, 1, 1, 255}));  // pure black
+  EXPECT_EQ((Bytes{c[1], m[1], y[1], k[1]}), (Bytes{1, 255, 255, 1}));  // 0 stores as 1.28
+  EXPECT_EQ((Bytes{c[2], m[2], y[2], k[2]}), (Bytes{1, 1, 1, 1}));
+}
+
+TEST(Halftone, DotSizesGrowAtDifferentRates) {
+  auto radius = [](int value, int channel) {
+    Bytes plane(20 * 20, static_cast<unsigned char>(value));
+    return IEL_Halftone_AnalyseCircleRadius(plane.data(), 20, 20, 10, 10, 9, channel);
+  };
+  EXPECT_EQ(radius(2, 1), 0);
+  EXPECT_EQ(radius(3, 1), 2);
+  EXPECT_EQ(radius(100, 1), 4);
+  EXPECT_EQ(radius(0, 2), 1);
+  EXPECT_EQ(radius(150, 2), 5);
+  EXPECT_EQ(radius(99, 3), 1);
+  EXPECT_EQ(radius(255, 3), 3);
+  // The mean is over 9 x 9 (81 pixels): one bright pixel of 255 gives 3.
+  Bytes spot(20 * 20, 0);
+  spot[10 * 20 + 14] = 255;
+  EXPECT_EQ(IEL_Halftone_AnalyseCircleRadius(spot.data(), 20, 20, 10, 10, 9, 1), 2);
+  EXPECT_EQ(IEL_Halftone_AnalyseCircleRadius(spot.data(), 20, 20, 9, 10, 9, 1), 0);
+}
+
+TEST(Halftone, BlackStaysBlackAndNothingGetsLighter) {
+  Rgb black(40, 30);
+  structIELEffectParams p{IEL_EFFECT_HALFTONE, nullptr, nullptr, 0, 0};
+  ASSERT_EQ(IEL_Apply_Effect(&black.a, &black.b, &p), IEL_OK);
+  for (unsigned char v : black.out) ASSERT_EQ(v, 0);
+
+  Rgb photo(64, 48);
+  photo.random(12);
+  ASSERT_EQ(IEL_Apply_Effect(&photo.a, &photo.b, &p), IEL_OK);
+  size_t darker = 0;
+  for (size_t i = 0; i < photo.out.size(); ++i) {
+    ASSERT_LE(photo.out[i], photo.in[i]);
+    darker += photo.out[i] < photo.in[i];
+  }
+  EXPECT_GT(darker, photo.out.size() / 10);  // the dots do print
+}
+
+TEST(Halftone, WhitePaperGetsTheSmallestDotsOnly) {
+  // White separates to C = M = Y = K = 1. Cyan's mean 1 draws no dot, so the
+  // screened cyan is paper (0) and red is 255 * (1 - 1 / 255) = 254
+  // everywhere; magenta and yellow draw radius-1 dots, spots without green or
+  // without blue.
+  Rgb white(60, 60);
+  white.fill(255, 255, 255);
+  ASSERT_EQ(IEL_Halftone_Colored_CMYK(&white.a, &white.b), IEL_OK);
+  size_t inked = 0;
+  for (size_t i = 0; i < white.out.size(); i += 3) {
+    ASSERT_EQ(white.out[i], 254) << i;
+    inked += white.out[i + 1] == 0 || white.out[i + 2] == 0;
+  }
+  EXPECT_GT(inked, 0u);
+  EXPECT_LT(inked, white.out.size() / 3 / 4);
+}
+
+// ---- vintage ----------------------------------------------------------------------
+
+TEST(Vintage, WarmFadedCurvesAndAlphaKept) {
+  uint8_t r[256], g[256], b[256];
+  IEL_Vintage_Curves(r, g, b);
+  // Black is lifted to a warm brown, white faded below 255.
+  EXPECT_EQ((Bytes{r[0], g[0], b[0]}), (Bytes{43, 13, 13}));
+  EXPECT_EQ((Bytes{r[255], g[255], b[255]}), (Bytes{240, 238, 238}));
+  for (int i = 1; i < 256; ++i) {
+    EXPECT_GE(r[i], r[i - 1]) << i;
+    EXPECT_GE(g[i], g[i - 1]) << i;
+    EXPECT_LE(b[i], g[i]) << i;
+  }
+  Argb im(2, 1);
+  im.in = {0x00000000u, 0x7FFFFFFFu};
+  structIELEffectParams p{IEL_EFFECT_VINTAGE, nullptr, nullptr, 0, 0};
+  ASSERT_EQ(IEL_Apply_Effect(&im.a, &im.b, &p), IEL_OK);
+  EXPECT_EQ(im.out[0], 0x002B0D0Du);
+  EXPECT_EQ(im.out[1], 0x7FF0EEEEu);
 }

@@ -126,6 +126,7 @@ public final class Operations {
         // colour tools
 
         // effects
+        ops.addAll(EffectOperations.list());
 
         // filters
 
