@@ -161,7 +161,8 @@ void IEL_DarkenOnlyBlendingRGB888(const structIELImage* input, structIELImage* o
 }
 
 // The first screen (75 degrees, channel 1) takes cyan, the second (45
-// degrees, channel 2) magenta and the third (15 degrees, channel 3) yellow;
+// degrees, channel 2, whose dots grow fastest and never vanish) yellow, the
+// least visible ink on paper, and the third (15 degrees, channel 3) magenta;
 // black stays a continuous tone. Each screen is drawn into a spare plane
 // while the separated plane is read for the dot sizes.
 int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
@@ -182,10 +183,12 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
   }
   IEL_Halftone_RGBtoCMYKconversion(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
   static const double kSlopes[3] = {3.732, 1.0, 0.2679};
+  static const int kPlane[3] = {0, 2, 1};  // cyan, yellow, magenta
   for (int i = 0; i < 3; ++i) {
-    IEL_Halftone_HalftonePerChannel(planes[i], planes[4], w, h, 9, kSlopes[i], i + 1);
-    unsigned char* t = planes[i];
-    planes[i] = planes[4];
+    const int p = kPlane[i];
+    IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    unsigned char* t = planes[p];
+    planes[p] = planes[4];
     planes[4] = t;
   }
   IEL_Halftone_CMYKtoRGBconversion(planes[0], planes[1], planes[2], planes[3], output->buffer, w, h);
