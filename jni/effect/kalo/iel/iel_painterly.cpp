@@ -323,7 +323,8 @@ int IEL_Variable_Blur_preview(structIELImage* input, structIELImage* output, uns
   const int ch = bpp == 2 ? 3 : bpp;
   // Column sums of one output row: width * channels ints a band.
   const int bands = px_band_count(h, 16);
-  auto* sums = static_cast<int*>(IF_MALLOC(static_cast<int>(sizeof(int)) * w * ch * bands));
+  const size_t sum_bytes = sizeof(int) * static_cast<size_t>(w) * ch * bands;
+  auto* sums = sum_bytes <= 0x7FFFFFFF ? static_cast<int*>(IF_MALLOC(static_cast<int>(sum_bytes))) : nullptr;
   if (!sums) {
     IF_ERROR("Failed to allocate \n");
     return IEL_ERR_ALLOC;
