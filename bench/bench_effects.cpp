@@ -95,3 +95,4 @@ BENCHMARK_CAPTURE(run, region_contrast, IEL_EFFECT_REGION_CONTRAST, 3, true)
 BENCHMARK_CAPTURE(run, region_exposure, IEL_EFFECT_REGION_EXPOSURE, 3, true)
     ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, vintage, IEL_EFFECT_VINTAGE, 0, true)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
+BENCHMARK_MAIN();
