@@ -40,7 +40,12 @@ extern std::atomic<uint32_t> total;
 
 class IELProgressScope {
  public:
-  IELProgressScope() { iel_progress::busy.store(1); }
+  // A cancel left pending by a request that raced the end of the previous
+  // effect is dropped before this one starts.
+  IELProgressScope() {
+    iel_progress::cancel_request.store(0);
+    iel_progress::busy.store(1);
+  }
   ~IELProgressScope() {
     iel_progress::cancel_request.store(0);
     iel_progress::busy.store(0);

@@ -173,6 +173,7 @@ public final class Operations {
         ops.addAll(ColourOperations.list());
 
         // effects
+        ops.addAll(EffectOperations.list());
 
         // filters
 

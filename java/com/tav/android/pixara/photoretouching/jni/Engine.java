@@ -251,6 +251,104 @@ public final class Engine {
     // (end of colour tools)
 
     // ---- effects of the effect library: painterly, halftone, kaleidoscope, reflection, region, vintage ----
+    // Whole-picture methods (in, out, width, height) work on a packed RGB copy
+    // and write the result with each pixel's alpha from the input; partial
+    // methods (in, mask, out, width, height, rect) write the effect's pixel
+    // where the mask byte is 1 inside the rectangle and the untouched input
+    // pixel elsewhere (the effect everywhere for an empty rectangle). They
+    // return SUCCESS, ERR_NULL, ERR_ALLOC or ERR_EFFECT; on a failure the
+    // output is left as passed. The caller owns every array.
+
+    /** Cartoon: dark outlines around flattened tones (5 x 5 outline window). */
+    public static native int applyCartoonize(int[] in, int[] out, int width, int height);
+
+    /** Cartoon of the selected pixels. */
+    public static native int applyCartoonizePartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /** Magic pen: glowing colour outlines on black (gradient strength of each channel). */
+    public static native int applyMagicPen(int[] in, int[] out, int width, int height);
+
+    /** Magic pen of the selected pixels. */
+    public static native int applyMagicPenPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /** Oil paint: darkened edges and a 3 x 3 mode filter. */
+    public static native int applyOilpaint(int[] in, int[] out, int width, int height);
+
+    /** Oil paint of the selected pixels. */
+    public static native int applyOilpaintPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /**
+     * Posterize: six levels a channel with a little extra contrast. Can be
+     * stopped from another thread with {@link #cancelEffect()} (ERR_EFFECT).
+     */
+    public static native int applyPosterize(int[] in, int[] out, int width, int height);
+
+    /** Posterize of the selected pixels. */
+    public static native int applyPosterizePartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /** Pencil sketch in grey: medium stroke darkness over a 7 x 7 dodge blur. */
+    public static native int applySketch(int[] in, int[] out, int width, int height);
+
+    /** Pencil sketch of the selected pixels. */
+    public static native int applySketchPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /**
+     * Pencil sketch on a paper texture: {@code texture} is a picture of the
+     * same size whose blue channel (lowest byte) is the paper's brightness.
+     * A null or short texture gives ERR_NULL.
+     */
+    public static native int applySketchTexture(int[] in, int[] texture, int[] out, int width, int height);
+
+    /** Sketch on texture of the selected pixels (note the argument order: texture before out, mask after). */
+    public static native int applySketchTexturePartial(int[] in, int[] texture, int[] out, byte[] mask, int width, int height, Rect rect);
+
+    /** Colour halftone: cyan, magenta and yellow dot screens printed over the picture (only darkens). */
+    public static native int applyHalftone(int[] in, int[] out, int width, int height);
+
+    /** Colour halftone of the selected pixels. */
+    public static native int applyHalftonePartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    // The following work on the caller's pixels directly.
+
+    /**
+     * Kaleidoscope: the centre of the picture mirrored eight ways into a
+     * square at the top, on opaque white. Returns SUCCESS (ERR_NULL for
+     * refused arguments).
+     */
+    public static native int applyKaleidoscope(int[] in, int[] out, int width, int height);
+
+    /**
+     * Reflection: the rows from {@code reflectionHeight} down show the rows
+     * above mirrored and fading. Needs reflectionHeight &lt; height &lt;=
+     * 2 * reflectionHeight, otherwise the output is left as passed. Returns
+     * SUCCESS (ERR_NULL for refused arguments).
+     */
+    public static native int applyReflection(int[] in, int[] out, int width, int height, int reflectionHeight);
+
+    /**
+     * Brightness of the tonal half touched at (touchX, touchY): a bright
+     * touch (mean of the 5 x 5 window 128 or more) lifts the bright pixels
+     * by 5 * level, otherwise the dark ones; a touch within 2 pixels of a
+     * border counts as dark. The output is opaque. Returns the effect
+     * library's code: 0 success, 3 touch outside the picture; ERR_NULL for
+     * refused arguments.
+     */
+    public static native int applyRegionBasedBrightness(int[] in, int[] out, int width, int height, int touchX, int touchY, int level);
+
+    /** Contrast of the touched tonal half; channels never cross mid-grey. Codes as above. */
+    public static native int applyRegionBasedContrast(int[] in, int[] out, int width, int height, int touchX, int touchY, int level);
+
+    /** Exposure of the touched tonal half, level -7..7 (1 outside). Codes as above. */
+    public static native int applyRegionBasedExposure(int[] in, int[] out, int width, int height, int touchX, int touchY, int level);
+
+    /** Vintage: a warm, faded film look; alpha kept. Refused arguments leave the output untouched. */
+    public static native void applyVintage(int[] in, int[] out, int width, int height);
+
+    /** Percentage done of the effect running on another thread (posterize, sepia, sketch blur). */
+    public static native int getEffectProgress();
+
+    /** Asks the effect running on another thread to stop; ignored when none runs. */
+    public static native void cancelEffect();
 
     // (end of effects of the effect library)
 

@@ -1,0 +1,198 @@
+// Colour halftone: CMYK separation, three rotated dot screens, recombination
+// and a darken-only blend with the original.
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+
+#include "../if_utils_and.h"
+#include "iel_artistic.h"
+#include "iel_internal.h"
+
+namespace {
+bool rgb888_only(int format) { return format == IEL_FORMAT_RGB888; }
+
+unsigned char store(double x) {
+  const double v = (x * 100 + 0.5) * 256 / 100;
+  return static_cast<unsigned char>(v < 0 ? 0 : (v > 255 ? 255 : v));
+}
+
+void IEL_DrawPixel(unsigned char* screen, int w, int h, int x, int y) {
+  if (x >= 0 && x < w && y >= 0 && y < h) screen[static_cast<size_t>(y) * w + x] = 255;
+}
+
+void span(unsigned char* screen, int w, int h, int y, int x0, int x1) {
+  for (int x = x0; x <= x1; ++x) IEL_DrawPixel(screen, w, h, x, y);
+}
+
+// A dot of radius r by the midpoint circle method, filled: every pair of
+// symmetric points on the circle is joined by a row of ink, so a dot reads
+// as a solid printed dot rather than a ring.
+void IEL_Halftone_bresan_circle(unsigned char* screen, int w, int h, int cx, int cy, int r) {
+  int x = r, y = 0, err = 1 - r;
+  while (x >= y) {
+    span(screen, w, h, cy + y, cx - x, cx + x);
+    span(screen, w, h, cy - y, cx - x, cx + x);
+    span(screen, w, h, cy + x, cx - y, cx + y);
+    span(screen, w, h, cy - x, cx - y, cx + y);
+    ++y;
+    if (err < 0) {
+      err += 2 * y + 1;
+    } else {
+      --x;
+      err += 2 * (y - x) + 1;
+    }
+  }
+}
+
+struct Screen {
+  const unsigned char* plane;
+  unsigned char* out;
+  int w, h, cell, channel;
+};
+
+// Dots along one screen line: from `origin`, every `cell` pixels in the
+// direction (dx, dy), for the steps t0..t1. A dot whose centre falls outside
+// the picture is skipped; radius 0 leaves the cell without ink.
+void IEL_Halftone_Line_Circle(const Screen& s, double ox, double oy, double dx, double dy, int t0, int t1) {
+  for (int t = t0; t <= t1; ++t) {
+    const int cx = static_cast<int>(std::floor(ox + t * s.cell * dx + 0.5));
+    const int cy = static_cast<int>(std::floor(oy + t * s.cell * dy + 0.5));
+    if (cx < 0 || cx >= s.w || cy < 0 || cy >= s.h) continue;
+    const int r = IEL_Halftone_AnalyseCircleRadius(s.plane, s.w, s.h, cx, cy, s.cell, s.channel);
+    if (r > 0) IEL_Halftone_bresan_circle(s.out, s.w, s.h, cx, cy, r);
+  }
+}
+}  // namespace
+
+void IEL_Halftone_RGBtoCMYKconversion(const unsigned char* rgb, int width, int height, unsigned char* c,
+                                      unsigned char* m, unsigned char* y, unsigned char* k) {
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  for (size_t i = 0; i < n; ++i) {
+    const double cc = 1 - rgb[3 * i] / 255.0, mm = 1 - rgb[3 * i + 1] / 255.0, yy = 1 - rgb[3 * i + 2] / 255.0;
+    double kk = cc < mm ? cc : mm;
+    kk = yy < kk ? yy : kk;
+    if (kk == 1) {
+      c[i] = m[i] = y[i] = 1;
+      k[i] = 255;
+      continue;
+    }
+    c[i] = store((cc - kk) / (1 - kk));
+    m[i] = store((mm - kk) / (1 - kk));
+    y[i] = store((yy - kk) / (1 - kk));
+    k[i] = store(kk);
+  }
+}
+
+int IEL_Halftone_AnalyseCircleRadius(const unsigned char* plane, int width, int height, int cx, int cy, int cell,
+                                     int channel) {
+  const int half = (cell - 1) >> 1;
+  int sum = 0;
+  for (int dy = -half; dy <= half; ++dy) {
+    int y = cy + dy;
+    y = y < 0 ? 0 : (y > height - 1 ? height - 1 : y);  // window clamped at the border
+    for (int dx = -half; dx <= half; ++dx) {
+      int x = cx + dx;
+      x = x < 0 ? 0 : (x > width - 1 ? width - 1 : x);
+      sum += plane[static_cast<size_t>(y) * width + x];
+    }
+  }
+  const int m = sum / (cell * cell);
+  switch (channel) {
+    case 1:
+      return m < 3 ? 0 : (m <= 9 ? 2 : (m <= 99 ? 3 : 4));
+    case 2:
+      return m < 20 ? 1 : (m < 40 ? 2 : (m <= 99 ? 3 : (m < 150 ? 4 : 5)));
+    default:
+      return m <= 99 ? 1 : (m < 150 ? 2 : 3);
+  }
+}
+
+// Dot geometry: the screen lines run in the direction (1, slope) (x right,
+// y down), normalised; they are spaced four cells (channel 1) or two cells
+// (channels 2 and 3) apart measured across the lines, and each line carries a
+// dot every cell along it. The lines are laid over the square of side
+// max(width, height) from the top-left corner, so every screen covers the
+// picture whatever its orientation.
+void IEL_Halftone_HalftonePerChannel(const unsigned char* plane, unsigned char* screen, int width, int height,
+                                     int cell, double slope, int channel) {
+  std::memset(screen, 0, static_cast<size_t>(width) * static_cast<size_t>(height));
+  const Screen s{plane, screen, width, height, cell, channel};
+  const double norm = std::sqrt(1 + slope * slope);
+  const double dx = 1 / norm, dy = slope / norm;  // along a line
+  const double nx = -dy, ny = dx;                  // across the lines
+  const int spacing = (channel == 1 ? 4 : 2) * cell;
+  const double side = width > height ? width : height;
+  // Extent of the square along both axes of the screen.
+  double amin = 0, amax = 0, bmin = 0, bmax = 0;
+  const double corners[4][2] = {{0, 0}, {side, 0}, {0, side}, {side, side}};
+  for (const auto& c : corners) {
+    const double a = c[0] * dx + c[1] * dy, b = c[0] * nx + c[1] * ny;
+    amin = a < amin ? a : amin, amax = a > amax ? a : amax;
+    bmin = b < bmin ? b : bmin, bmax = b > bmax ? b : bmax;
+  }
+  const int j0 = static_cast<int>(std::floor(bmin / spacing)), j1 = static_cast<int>(std::ceil(bmax / spacing));
+  const int t0 = static_cast<int>(std::floor(amin / cell)), t1 = static_cast<int>(std::ceil(amax / cell));
+  for (int j = j0; j <= j1; ++j) {
+    IEL_Halftone_Line_Circle(s, j * spacing * nx, j * spacing * ny, dx, dy, t0, t1);
+  }
+}
+
+void IEL_Halftone_CMYKtoRGBconversion(const unsigned char* c, const unsigned char* m, const unsigned char* y,
+                                      const unsigned char* k, unsigned char* rgb, int width, int height) {
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  for (size_t i = 0; i < n; ++i) {
+    unsigned char* o = rgb + 3 * i;
+    if (k[i] < 1) {
+      o[0] = o[1] = o[2] = 0;
+      continue;
+    }
+    const double f = 1 - k[i] / 255.0;
+    o[0] = static_cast<unsigned char>((255 - c[i]) * f);
+    o[1] = static_cast<unsigned char>((255 - m[i]) * f);
+    o[2] = static_cast<unsigned char>((255 - y[i]) * f);
+  }
+}
+
+void IEL_DarkenOnlyBlendingRGB888(const structIELImage* input, structIELImage* output) {
+  const size_t n = static_cast<size_t>(input->width) * static_cast<size_t>(input->height) * 3;
+  for (size_t i = 0; i < n; ++i) {
+    if (input->buffer[i] < output->buffer[i]) output->buffer[i] = input->buffer[i];
+  }
+}
+
+// The first screen (75 degrees, channel 1) takes cyan, the second (45
+// degrees, channel 2, whose dots grow fastest and never vanish) yellow, the
+// least visible ink on paper, and the third (15 degrees, channel 3) magenta;
+// black stays a continuous tone. Each screen is drawn into a spare plane
+// while the separated plane is read for the dot sizes.
+int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  const int w = input->width, h = input->height;
+  const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
+  std::memcpy(output->buffer, input->buffer, n * 3);
+  unsigned char* planes[5] = {};
+  bool ok = true;
+  for (auto& p : planes) {
+    p = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n)));
+    ok = ok && p;
+  }
+  if (!ok) {
+    IF_ERROR("Failed to allocate \n");
+    for (auto* p : planes) IF_FREE(p);
+    return IEL_ERR_ALLOC;
+  }
+  IEL_Halftone_RGBtoCMYKconversion(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
+  static const double kSlopes[3] = {3.732, 1.0, 0.2679};
+  static const int kPlane[3] = {0, 2, 1};  // cyan, yellow, magenta
+  for (int i = 0; i < 3; ++i) {
+    const int p = kPlane[i];
+    IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    unsigned char* t = planes[p];
+    planes[p] = planes[4];
+    planes[4] = t;
+  }
+  IEL_Halftone_CMYKtoRGBconversion(planes[0], planes[1], planes[2], planes[3], output->buffer, w, h);
+  IEL_DarkenOnlyBlendingRGB888(input, output);
+  for (auto* p : planes) IF_FREE(p);
+  return IEL_OK;
+}

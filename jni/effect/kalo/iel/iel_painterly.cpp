@@ -1,0 +1,472 @@
+// Painterly effects: cartoon, oil paint (Gaussian blur and mode filter),
+// posterize, magic pen, pencil sketch, sketch on texture, spread.
+#include <atomic>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+
+#include "../if_utils_and.h"
+#include "../px_parallel.h"
+#include "iel_artistic.h"
+#include "iel_internal.h"
+#include "iel_luma.h"
+
+namespace {
+bool rgb888_only(int format) { return format == IEL_FORMAT_RGB888; }
+// Pixel formats whose buffer holds width * height pixels of 2, 3 or 4 bytes.
+// The planar layouts (4 to 6) hold fewer bytes than a 3-byte reading would
+// touch, so the effects that work pixel by pixel refuse them.
+bool packed_pixels(int format) {
+  return format == IEL_FORMAT_RGB565 || format == IEL_FORMAT_RGB888 || format == IEL_FORMAT_ARGB_PACK;
+}
+
+int clampi(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
+
+size_t pixel_count(const structIELImage* im) {
+  return static_cast<size_t>(im->width) * static_cast<size_t>(im->height);
+}
+
+void copy_image(const structIELImage* in, structIELImage* out) {
+  std::memcpy(out->buffer, in->buffer, pixel_count(in) * IEL_BytesPerPixel(in->format));
+}
+
+inline uint32_t luma_sum(const unsigned char* p) { return IEL_LumaSum(p[0], p[1], p[2]); }
+inline int luma(const unsigned char* p) { return static_cast<int>((luma_sum(p) >> 10) & 255); }
+
+// Channels of one pixel of a packed format (565 unpacked to 8-bit values).
+inline void read_channels(const unsigned char* p, int bpp, int* c) {
+  if (bpp == 2) {
+    uint16_t v;
+    std::memcpy(&v, p, 2);
+    c[0] = (v & 0xF800) >> 8;
+    c[1] = (v & 0x07E0) >> 3;
+    c[2] = (v << 3) & 0xF8;
+    return;
+  }
+  for (int i = 0; i < bpp; ++i) c[i] = p[i];
+}
+
+inline void write_channels(unsigned char* p, int bpp, const int* c) {
+  if (bpp == 2) {
+    uint16_t v = static_cast<uint16_t>((c[0] & 0xF8) << 8 | (c[1] & 0xFC) << 3 | c[2] >> 3);
+    std::memcpy(p, &v, 2);
+    return;
+  }
+  for (int i = 0; i < bpp; ++i) p[i] = static_cast<unsigned char>(c[i]);
+}
+}  // namespace
+
+// ---- cartoon ------------------------------------------------------------------
+
+int IEL_CartoonNew3(structIELImage* input, structIELImage* output, int level) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  const int r = clampi(level, 1, 4);
+  const int w = input->width, h = input->height;
+  // A picture with no pixel r away from every border has nothing to draw
+  // from: it is passed through unchanged.
+  if (w < 2 * r + 1 || h < 2 * r + 1) {
+    copy_image(input, output);
+    return IEL_OK;
+  }
+  const size_t n = pixel_count(input);
+  auto* lum = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n)));
+  auto* hmax = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n)));
+  if (!lum || !hmax) {
+    IF_ERROR("Failed to allocate \n");
+    IF_FREE(lum);
+    IF_FREE(hmax);
+    return IEL_ERR_ALLOC;
+  }
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  px_for_rows(h, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const unsigned char* p = src + static_cast<size_t>(y) * w * 3;
+      unsigned char* l = lum + static_cast<size_t>(y) * w;
+      for (int x = 0; x < w; ++x) l[x] = static_cast<unsigned char>(luma(p + 3 * x));
+      unsigned char* m = hmax + static_cast<size_t>(y) * w;
+      for (int x = r; x < w - r; ++x) {
+        int best = 0;
+        for (int k = -r; k <= r; ++k) best = l[x + k] > best ? l[x + k] : best;
+        m[x] = static_cast<unsigned char>(best);
+      }
+    }
+  });
+  px_for_rows(h - 2 * r, [&](int b0, int b1) {
+    for (int y = b0 + r; y < b1 + r; ++y) {
+      const unsigned char* srow = src + static_cast<size_t>(y) * w * 3;
+      unsigned char* drow = dst + static_cast<size_t>(y) * w * 3;
+      for (int x = r; x < w - r; ++x) {
+        int big = 0;
+        for (int k = -r; k <= r; ++k) {
+          int v = hmax[static_cast<size_t>(y + k) * w + x];
+          big = v > big ? v : big;
+        }
+        const int yl = lum[static_cast<size_t>(y) * w + x];
+        int e = yl * 255 / (big + 1);
+        if (e > 255) e = 255;
+        const int s = e * e >> 8;
+        const int q = yl >> 2;
+        const unsigned char* p = srow + 3 * x;
+        unsigned char* o = drow + 3 * x;
+        for (int c = 0; c < 3; ++c) {
+          int v = p[c];
+          if (yl > 89) {
+            const int a = yl > 160 ? q + 25 : q + 5;
+            v = s * (v + a > 255 ? 255 : v + a) >> 8;
+          } else {
+            // Dark areas lose q + 5 first, then q + 30 more, as the mid-tones do.
+            if (yl <= 30) v = v - (q + 5) < 0 ? 0 : v - (q + 5);
+            v = s * (v - (q + 30) < 0 ? 0 : v - (q + 30)) >> 8;
+          }
+          o[c] = static_cast<unsigned char>(v);
+        }
+      }
+      for (int x = r; x > 0; --x) std::memcpy(drow + 3 * (x - 1), drow + 3 * x, 3);
+      for (int x = w - r - 1; x < w - 1; ++x) std::memcpy(drow + 3 * (x + 1), drow + 3 * x, 3);
+    }
+  });
+  const size_t row = static_cast<size_t>(w) * 3;
+  for (int y = r; y > 0; --y) std::memcpy(dst + (y - 1) * row, dst + y * row, row);
+  for (int y = h - r - 1; y < h - 1; ++y) std::memcpy(dst + (y + 1) * row, dst + y * row, row);
+  IF_FREE(lum);
+  IF_FREE(hmax);
+  return IEL_OK;
+}
+
+// ---- oil paint ------------------------------------------------------------------
+
+int IEL_GaussianBlur(structIELImage* input, structIELImage* output) {
+  if (!input || !output || !input->buffer || !output->buffer) {
+    IF_ERROR("Invalid Image pointer:\n");
+    return IEL_ERR_NULL;
+  }
+  const int w = input->width, h = input->height;
+  if (w < 1 || h < 1) return IEL_OK;
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  const size_t row = static_cast<size_t>(w) * 3;
+  px_for_rows(h, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const unsigned char* rows[3] = {src + (y > 0 ? y - 1 : 0) * row, src + y * row,
+                                      src + (y < h - 1 ? y + 1 : h - 1) * row};
+      unsigned char* o = dst + y * row;
+      for (int x = 0; x < w; ++x) {
+        const int xl = 3 * (x > 0 ? x - 1 : 0), xc = 3 * x, xr = 3 * (x < w - 1 ? x + 1 : w - 1);
+        for (int c = 0; c < 3; ++c) {
+          int s = 0;
+          for (int k = 0; k < 3; ++k) {
+            const int wk = k == 1 ? 2 : 1;
+            s += wk * (rows[k][xl + c] + 2 * rows[k][xc + c] + rows[k][xr + c]);
+          }
+          o[xc + c] = static_cast<unsigned char>(s / 16);
+        }
+      }
+    }
+  });
+  return IEL_OK;
+}
+
+int IEL_OilifyFix(structIELImage* input, structIELImage* output) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, packed_pixels)) return rc;
+  const int w = input->width, h = input->height;
+  const int bpp = IEL_BytesPerPixel(input->format);
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  px_for_rows(h, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const int ys[3] = {y > 0 ? y - 1 : 0, y, y < h - 1 ? y + 1 : h - 1};
+      for (int x = 0; x < w; ++x) {
+        const int xs[3] = {x > 0 ? x - 1 : 0, x, x < w - 1 ? x + 1 : w - 1};
+        unsigned char hist[16] = {};
+        int best = 0;
+        const unsigned char* pick = nullptr;
+        for (int cx : xs) {
+          for (int cy : ys) {
+            const unsigned char* p = src + (static_cast<size_t>(cy) * w + cx) * bpp;
+            int ch[4] = {};
+            read_channels(p, bpp, ch);
+            const int lv = static_cast<int>(IEL_LumaSum(ch[0], ch[1], ch[2]) >> 14);
+            if (++hist[lv] > best) {
+              best = hist[lv];
+              pick = p;
+            }
+          }
+        }
+        std::memcpy(dst + (static_cast<size_t>(y) * w + x) * bpp, pick, bpp);
+      }
+    }
+  });
+  return IEL_OK;
+}
+
+int IEL_OilPaintEdge(structIELImage* input, structIELImage* output) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  const size_t n = pixel_count(input);
+  auto* work = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 3)));
+  if (!work) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  structIELImage blurred{input->width, input->height, input->format, work};
+  if (int rc = IEL_GaussianBlur(input, &blurred)) {
+    IF_ERROR("Error in Guassian Blur\n");
+    IF_FREE(work);
+    return rc;
+  }
+  const unsigned char* src = input->buffer;
+  for (size_t i = 0; i < n; ++i) {
+    const unsigned char* p = src + 3 * i;
+    unsigned char* q = work + 3 * i;
+    const int d = q[0] - p[0];
+    // Only a blurred red at least two above the pixel's own darkens it.
+    if (d > 0 && d != 1) {
+      for (int c = 0; c < 3; ++c) q[c] = static_cast<unsigned char>(p[c] * p[c] / 255);
+    } else {
+      std::memcpy(q, p, 3);
+    }
+  }
+  int rc = IEL_OilifyFix(&blurred, output);
+  IF_FREE(work);
+  return rc;
+}
+
+// ---- posterize ------------------------------------------------------------------
+
+int IEL_PosterizeNew(structIELImage* input, structIELImage* output) {
+  IELProgressScope progress;
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, packed_pixels)) return rc;
+  const int bpp = IEL_BytesPerPixel(input->format);
+  int table[256];
+  table[0] = 0;
+  for (int i = 1; i < 256; ++i) {
+    const double v = (0.5 + (i / 255.0 - 0.5) * 1.2100000000000002) * 255.0;
+    table[i] = v < 0 ? 0 : (v > 255 ? 255 : static_cast<int>(v));
+  }
+  int level[256];
+  for (int i = 0; i < 256; ++i) level[i] = table[(i / 43) * 43];
+  const int w = input->width, h = input->height;
+  progress.start(static_cast<uint32_t>(h));
+  if (progress.cancelled()) return IEL_ERR_CANCELLED;
+  std::atomic<bool> stopped{false};
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  const size_t row = static_cast<size_t>(w) * bpp;
+  px_for_rows(
+      h,
+      [&](int y0, int y1) {
+        for (int y = y0; y < y1; ++y) {
+          if (progress.cancelled() || stopped.load(std::memory_order_relaxed)) {
+            stopped.store(true);
+            return;
+          }
+          const unsigned char* p = src + y * row;
+          unsigned char* o = dst + y * row;
+          for (int x = 0; x < w; ++x, p += bpp, o += bpp) {
+            int c[4] = {};
+            read_channels(p, bpp, c);
+            // A 4-byte pixel keeps its fourth byte as the output holds it.
+            c[0] = level[c[0]], c[1] = level[c[1]], c[2] = level[c[2]];
+            write_channels(o, bpp == 4 ? 3 : bpp, c);
+          }
+          progress.advance();
+        }
+      },
+      16);
+  return stopped.load() ? IEL_ERR_CANCELLED : IEL_OK;
+}
+
+// ---- magic pen --------------------------------------------------------------------
+
+int IEL_MagicPenNew_RGB(structIELImage* input, structIELImage* output) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  const int w = input->width, h = input->height;
+  // Without interior pixels there is no gradient to draw: passed through.
+  if (w < 3 || h < 3) {
+    copy_image(input, output);
+    return IEL_OK;
+  }
+  const size_t row = static_cast<size_t>(w) * 3;
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  px_for_rows(h - 2, [&](int b0, int b1) {
+    for (int y = b0 + 1; y < b1 + 1; ++y) {
+      const unsigned char* a = src + (y - 1) * row;
+      const unsigned char* b = src + y * row;
+      const unsigned char* c = src + (y + 1) * row;
+      unsigned char* o = dst + y * row;
+      for (int i = 3; i < static_cast<int>(row) - 3; ++i) {
+        const int gx = (a[i + 3] - a[i - 3]) + 2 * (b[i + 3] - b[i - 3]) + (c[i + 3] - c[i - 3]);
+        const int gy = (c[i - 3] + 2 * c[i] + c[i + 3]) - (a[i - 3] + 2 * a[i] + a[i + 3]);
+        const double g = std::sqrt(static_cast<double>(gx * gx + gy * gy));
+        o[i] = g >= 255.0 ? 255 : static_cast<unsigned char>(g);
+      }
+      std::memcpy(o, o + 3, 3);
+      std::memcpy(o + row - 3, o + row - 6, 3);
+    }
+  });
+  std::memcpy(dst, dst + row, row);
+  std::memcpy(dst + (h - 1) * row, dst + (h - 2) * row, row);
+  return IEL_OK;
+}
+
+// ---- box blur and sketch -----------------------------------------------------------
+
+int IEL_Variable_Blur_preview(structIELImage* input, structIELImage* output, unsigned int level) {
+  IELProgressScope progress;
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, packed_pixels)) return rc;
+  static const int kSizes[5] = {3, 5, 7, 9, 11};
+  const int k = kSizes[level > 4 ? 4 : level];
+  const int r = k / 2, area = k * k;
+  const int w = input->width, h = input->height;
+  const int bpp = IEL_BytesPerPixel(input->format);
+  const int ch = bpp == 2 ? 3 : bpp;
+  // Column sums of one output row: width * channels ints a band.
+  const int bands = px_band_count(h, 16);
+  const size_t sum_bytes = sizeof(int) * static_cast<size_t>(w) * ch * bands;
+  auto* sums = sum_bytes <= 0x7FFFFFFF ? static_cast<int*>(IF_MALLOC(static_cast<int>(sum_bytes))) : nullptr;
+  if (!sums) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  progress.start(static_cast<uint32_t>(h));
+  std::atomic<bool> stopped{false};
+  std::atomic<int> next_band{0};
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  const size_t row = static_cast<size_t>(w) * bpp;
+  px_for_rows(
+      h,
+      [&](int y0, int y1) {
+        int* col = sums + static_cast<size_t>(next_band.fetch_add(1)) * w * ch;
+        for (int y = y0; y < y1; ++y) {
+          if (progress.cancelled() || stopped.load(std::memory_order_relaxed)) {
+            stopped.store(true);
+            return;
+          }
+          std::memset(col, 0, sizeof(int) * w * ch);
+          for (int dy = -r; dy <= r; ++dy) {
+            const int sy = clampi(y + dy, 0, h - 1);
+            const unsigned char* p = src + sy * row;
+            for (int x = 0; x < w; ++x, p += bpp) {
+              int c[4] = {};
+              read_channels(p, bpp, c);
+              for (int i = 0; i < ch; ++i) col[x * ch + i] += c[i];
+            }
+          }
+          unsigned char* o = dst + y * row;
+          for (int x = 0; x < w; ++x, o += bpp) {
+            int acc[4] = {};
+            for (int dx = -r; dx <= r; ++dx) {
+              const int sx = clampi(x + dx, 0, w - 1);
+              for (int i = 0; i < ch; ++i) acc[i] += col[sx * ch + i];
+            }
+            for (int i = 0; i < ch; ++i) acc[i] /= area;
+            write_channels(o, bpp, acc);
+          }
+          progress.advance();
+        }
+      },
+      16);
+  IF_FREE(sums);
+  return stopped.load() ? IEL_ERR_CANCELLED : IEL_OK;
+}
+
+int IEL_SketchNew2(structIELImage* input, structIELImage* output, int strokeDarkness, int blurLevel) {
+  if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  strokeDarkness = clampi(strokeDarkness, 1, 3);
+  blurLevel = clampi(blurLevel, 1, 2);
+  const size_t n = pixel_count(input);
+  auto* grey = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 3)));
+  if (!grey) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  structIELImage work{input->width, input->height, input->format, grey};
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  for (size_t i = 0; i < n; ++i) std::memset(dst + 3 * i, 255 - luma(src + 3 * i), 3);
+  int rc = IEL_Variable_Blur_preview(output, &work, static_cast<unsigned>(blurLevel));
+  if (rc != IEL_OK) {
+    IF_ERROR("Error in Blur:\n");
+    IF_FREE(grey);
+    return rc;
+  }
+  for (size_t i = 0; i < n; ++i) {
+    int d = 255 - grey[3 * i];
+    if (d < 4) d = 4;
+    int v = luma(src + 3 * i) * 255 / d;
+    std::memset(dst + 3 * i, v > 255 ? 255 : v, 3);
+  }
+  rc = IEL_Variable_Blur_preview(output, &work, 0);
+  if (rc == IEL_OK) {
+    for (size_t i = 0; i < n; ++i) {
+      int c = grey[3 * i];
+      for (int k = 0; k < strokeDarkness; ++k) c = c * c >> 8;
+      std::memset(dst + 3 * i, c, 3);
+    }
+  }
+  IF_FREE(grey);
+  return rc;
+}
+
+int IEL_Sketch_Texture(structIELImage* input, structIELImage* output, structIELImage* texture, int, int) {
+  if (!texture || !texture->buffer) {
+    IF_ERROR("Texture image structure in NULL \n");
+    return IEL_ERR_NULL;
+  }
+  if (int rc = IEL_SketchNew2(input, output, 3, 3)) return rc;
+  if (texture->width != input->width || texture->height != input->height ||
+      texture->format != IEL_FORMAT_ARGB_PACK) {
+    IF_ERROR("Textrue image dims(%d x %d) MUST match Input Dims \n", texture->width, texture->height);
+    return IEL_ERR_DIMENSION;
+  }
+  const size_t n = pixel_count(input);
+  unsigned char* dst = output->buffer;
+  for (size_t i = 0; i < n; ++i) {
+    uint32_t tp;
+    std::memcpy(&tp, texture->buffer + 4 * i, 4);
+    const int t = static_cast<int>(tp & 0xFF);
+    const int s = dst[3 * i];
+    const int v = (s * s + (t - 15) * (255 - s)) / 255;
+    std::memset(dst + 3 * i, clampi(v, 0, 255), 3);
+  }
+  return IEL_OK;
+}
+
+// ---- spread ---------------------------------------------------------------------------
+
+int IEL_Spread_ARGB(structIELImage* input, structIELImage* output, unsigned char amount) {
+  const int k = amount == 0 ? 1 : (1 << (amount > 4 ? 4 : amount)) - 1;
+  if (!input || !output || !input->buffer || !output->buffer) {
+    return IEL_CheckEffectImages(__func__, input, output, 1, 1, nullptr);
+  }
+  const int w = input->width, h = input->height;
+  if (w <= 0 || h <= 0) {
+    IF_ERROR("Failed with Error = %d", 1);
+    return IEL_ERR_NULL;
+  }
+  if (input->format != IEL_FORMAT_ARGB_PACK || output->format != IEL_FORMAT_ARGB_PACK) {
+    IF_ERROR("Failed with input image format= %d", input->format);
+    return IEL_ERR_FORMAT;
+  }
+  const auto* src = reinterpret_cast<const uint32_t*>(input->buffer);
+  auto* dst = reinterpret_cast<uint32_t*>(output->buffer);
+  std::memset(dst, 0, pixel_count(input) * 4);
+  for (int y = 0; y < h; ++y) {
+    for (int x = 0; x < w; ++x) {
+      const long a = if_lrand();
+      const long b = if_lrand();
+      int sx = x + k - 2 * static_cast<int>((a + 1) % k);
+      int sy = y + k - 2 * static_cast<int>((b + 1) % k);
+      if (sx >= w) {
+        sx %= w;
+      } else if (sx < 0) {
+        sx = -(sx % w);
+      }
+      sy = clampi(sy, 0, h - 1);
+      dst[static_cast<size_t>(y) * w + x] = src[static_cast<size_t>(sy) * w + sx];
+    }
+  }
+  return IEL_OK;
+}
