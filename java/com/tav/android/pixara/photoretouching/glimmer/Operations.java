@@ -132,6 +132,7 @@ public final class Operations {
         // geometry
 
         // blur
+        ops.addAll(BlurOperations.list());
 
         // object tools
 
