@@ -111,14 +111,14 @@ struct Job {
 
   Scratch take_slot() {
     unsigned char* m = memory + slot_bytes * static_cast<size_t>(next_slot.fetch_add(1));
-    const size_t line = line_elements();
+    const auto line = static_cast<size_t>(line_elements());  // fits: the slot was allocated
     auto* a = reinterpret_cast<uint16_t*>(m);
     return {a, a + line, reinterpret_cast<uint32_t*>(a + 2 * line)};
   }
   // Elements of one line buffer: a row of R, G, B or a stripe of all rows.
-  size_t line_elements() const {
-    const size_t row = static_cast<size_t>(width) * 3;
-    const size_t stripe = static_cast<size_t>(height) * kLanes;
+  uint64_t line_elements() const {
+    const uint64_t row = static_cast<uint64_t>(width) * 3;
+    const uint64_t stripe = static_cast<uint64_t>(height) * kLanes;
     return row > stripe ? row : stripe;
   }
 };
@@ -206,8 +206,10 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   const int stripe_bands = px_band_count(stripes, kMinStripesPerBand);
   const int slots = row_bands + stripe_bands;
   const uint64_t line = job.line_elements();
-  job.slot_bytes = static_cast<size_t>((2 * line * sizeof(uint16_t) + kLanes * sizeof(uint32_t) + 15) & ~15ull);
-  const uint64_t total = static_cast<uint64_t>(job.slot_bytes) * static_cast<uint64_t>(slots);
+  // Sizes are worked out in 64 bits: one allocation holds at most 2^31 - 1 bytes.
+  const uint64_t slot = (2 * line * sizeof(uint16_t) + kLanes * sizeof(uint32_t) + 15) & ~15ull;
+  const uint64_t total = slot * static_cast<uint64_t>(slots);
+  job.slot_bytes = static_cast<size_t>(slot);
   job.memory = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
   if (!job.memory) {
     // Kept as it always was: the failure is logged and reported as success.

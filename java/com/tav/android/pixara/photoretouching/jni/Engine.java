@@ -141,8 +141,11 @@ public final class Engine {
      * The full selective blur at level 0..7, independent of any session:
      * blurred pixels where the mask is 1, the input pixel elsewhere. An empty
      * rectangle blurs every pixel (the mask may then be null; when given it is
-     * left all 0). A session started with an empty rectangle makes this blur
-     * every pixel too, until the next {@link #initBlur}.
+     * left all 0). After a session started with an empty rectangle (even once
+     * destroyed) the full-size mask is not consulted until the next
+     * {@link #initBlur} with a rectangle: unselected pixels are then kept
+     * sharp only through the reduced mask, so they may take some blur near the
+     * selection's edge.
      */
     public static native void applyBlur(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
 
