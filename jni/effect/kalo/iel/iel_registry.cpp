@@ -3,6 +3,7 @@
 #include "iel_artistic.h"
 #include "iel_effects.h"
 #include "iel_internal.h"
+#include "iel_variable_blur.h"
 
 namespace {
 int level_of(const structIELEffectParams* p) { return p->level ? *p->level : 0; }
@@ -72,7 +73,7 @@ const IELEffectEntry kEffects[] = {
     // end of halftone, kaleidoscope, reflection, region and vintage effects
 
     // variable blur
-
+    {IEL_EFFECT_VARIABLE_BLUR, 0, false, IEL_Apply_VariableBlur},
     // end of variable blur
 };
 }  // namespace

@@ -181,6 +181,7 @@ public final class Operations {
         ops.addAll(GeometryOperations.list());
 
         // blur
+        ops.addAll(BlurOperations.list());
 
         // object tools
         ops.addAll(ObjectOperations.list());

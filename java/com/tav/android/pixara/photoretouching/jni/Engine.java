@@ -490,6 +490,81 @@ public final class Engine {
     // (end of geometry)
 
     // ---- blur and depth of field: selective blur, tilt-shift, miniature ----
+    // Both tools blur a copy of the picture reduced by a power of two (halved
+    // above 420 pixels on the longer side, down to a sixteenth above 3250) and
+    // bring it back with bilinear interpolation. Blur masks: a byte of 1 marks
+    // a pixel to blur (background), any other value keeps it sharp (subject).
+    // The library keeps one set of reduced buffers for both tools: initBlur
+    // and initTiltShift fill it (initTiltShift first releases a blur state),
+    // the previews use it, destroyBlur / destroyTiltShift free it. A preview
+    // without a kept state writes nothing; destroying twice is harmless. The
+    // apply methods never use the kept buffers. The caller owns every array.
+
+    /**
+     * Starts a selective-blur session: keeps the reduced picture and mask for
+     * {@link #runBlurinPreview}. Arguments: picture (width * height), mask
+     * (width * height; may be null only for an empty rectangle), size, rectangle.
+     * An empty rectangle blurs the whole picture: the mask, when given, is left
+     * all 0. Returns SUCCESS, ERR_NULL (null or short array, bad size, rectangle
+     * outside; nothing kept or written) or ERR_ALLOC (no state kept).
+     */
+    public static native int initBlur(int[] in, byte[] mask, int width, int height, Rect rect);
+
+    /**
+     * Preview of the selective blur at level 0..7 (0 none, 7 strongest; higher
+     * levels as 8) from the state of {@link #initBlur}: out (width * height)
+     * receives the blurred pixels where the mask is 1 and the input elsewhere
+     * (everywhere blurred when the session was started with an empty
+     * rectangle). in, mask and out must all hold width * height elements, the
+     * preview's own size. Writes nothing without a session.
+     */
+    public static native void runBlurinPreview(int[] in, byte[] mask, int[] out, int width, int height, int level);
+
+    /**
+     * The full selective blur at level 0..7, independent of any session:
+     * blurred pixels where the mask is 1, the input pixel elsewhere. An empty
+     * rectangle blurs every pixel (the mask may then be null; when given it is
+     * left all 0). After a session started with an empty rectangle (even once
+     * destroyed) the full-size mask is not consulted until the next
+     * {@link #initBlur} with a rectangle: unselected pixels are then kept
+     * sharp only through the reduced mask, so they may take some blur near the
+     * selection's edge.
+     */
+    public static native void applyBlur(int[] in, byte[] mask, int[] out, int width, int height, int level, Rect rect);
+
+    /** Frees the selective-blur state. */
+    public static native void destroyBlur();
+
+    /**
+     * Starts a tilt-shift session with the picture (width * height, only
+     * read): keeps its reduced copy for {@link #makeTiltShift}. Releases a
+     * selective-blur state.
+     */
+    public static native void initTiltShift(int[] in, int width, int height);
+
+    /**
+     * Tilt-shift preview from the kept state: rows within halfBand of row
+     * center stay sharp, the rest blends into the blur over half the distance
+     * to the farther edge. in and out hold width * height elements (the
+     * preview's own size). Writes nothing without a session.
+     */
+    public static native void makeTiltShift(int[] in, int[] out, int width, int height, int center, int halfBand);
+
+    /** The full tilt-shift (as {@link #makeTiltShift}), independent of any session. */
+    public static native void applyTiltShift(int[] in, int[] out, int width, int height, int center, int halfBand);
+
+    /** Miniature look: saturation 16 (of 0..20), then tilt-shift around the middle row, half band height / 8. */
+    public static native void applyMiniature(int[] in, int[] out, int width, int height);
+
+    /** Frees the tilt-shift state. */
+    public static native void destroyTiltShift();
+
+    /**
+     * Out-focus blur of the whole picture at level 0..7 (radius 3, 7, 15, 31,
+     * 41, 49, 55, 63 pixels; higher levels as 7, negative as 0). Returns
+     * SUCCESS, ERR_NULL or ERR_EFFECT.
+     */
+    public static native int applyOutfocusBlur(int[] in, int[] out, int width, int height, int level);
 
     // (end of blur and depth of field)
 

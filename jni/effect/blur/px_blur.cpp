@@ -1,0 +1,409 @@
+// Selective blur, tilt-shift, miniature and out-focus blur on a reduced copy
+// of the picture.
+#include "px_blur.h"
+
+#include <cstdint>
+#include <cstring>
+
+#include "../kalo/iel/iel.h"
+#include "../kalo/px_mem.h"
+#include "../kalo/px_parallel.h"
+#include "../px_color/px_tone.h"
+#include "../px_types.h"
+
+namespace {
+// Kept between calls.
+unsigned char* g_ssrc = nullptr;   // reduced picture, packed RGB
+unsigned char* g_tempd = nullptr;  // reduced mask (selective blur only)
+unsigned char* g_sblur = nullptr;  // blurred reduced picture
+int g_scaled_wd = 0;
+int g_scaled_ht = 0;
+int resize_ratio = 0;  // reduction shift of the tilt-shift initialisation
+int all = 0;           // 1: the selective blur covers the whole picture
+
+// Weights by distance from the centre tap.
+constexpr int kKernel[5] = {9, 8, 7, 5, 3};
+
+// Tap range [start, end) of the selective blur by level; odd levels reach one
+// tap further left than right.
+struct Taps {
+  int start, end;
+};
+constexpr Taps kTaps[9] = {{0, 1}, {-1, 1}, {-1, 2}, {-2, 2}, {-2, 3}, {-3, 3}, {-3, 4}, {-4, 4}, {-4, 5}};
+
+Taps taps_of(int level) {
+  if (level < 0) level = 0;  // no blur for a negative level, as for level 0
+  return kTaps[level > 8 ? 8 : level];
+}
+
+// Radius of the out-focus blur by level.
+constexpr int kOutfocusRadius[8] = {3, 7, 15, 31, 41, 49, 55, 63};
+
+bool is_empty(int left, int right, int top, int bottom) { return left > right || top > bottom; }
+
+size_t area(int w, int h) { return static_cast<size_t>(w) * static_cast<size_t>(h); }
+
+int clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
+
+// Sampling position of one output row or column on the reduced picture:
+// 17.15 accumulator, index masked to 11 bits, 5-bit fraction, an index at or
+// beyond the last one clamped to the last but one. A reduced side of 1 pairs
+// its only row with itself.
+struct Sample {
+  int i0, i1, f;
+};
+Sample sample(int pos, int64_t step, int n) {
+  const int64_t a = static_cast<int64_t>(pos) * step;
+  int i = static_cast<int>((a >> 15) & 0x7FF);
+  const int f = static_cast<int>((a >> 10) & 31);
+  if (i >= n - 1) i = n >= 2 ? n - 2 : 0;
+  return {i, i + 1 < n ? i + 1 : i, f};
+}
+
+// 17.15 step from a full-size side to its reduced side (64-bit so that huge
+// sides cannot overflow).
+int64_t step_of(int reduced, int full) { return (static_cast<int64_t>(reduced) << 15) / full; }
+
+// One separable pass: for every pixel, the taps [start, end) along the pass
+// direction (stride `along` bytes between neighbours, `n` pixels on the line,
+// `pos` the pixel's place on it). Masked passes replace an unselected
+// neighbour by the centre pixel with weight 9.
+template <bool kMasked>
+void blur_line(const unsigned char* src, unsigned char* dst, const unsigned char* mask, int n, int along_px,
+               Taps taps) {
+  for (int pos = 0; pos < n; ++pos) {
+    const unsigned char* c = src + static_cast<size_t>(pos) * along_px * 3;
+    int sum[3] = {0, 0, 0};
+    int weight = 0;
+    for (int o = taps.start; o < taps.end; ++o) {
+      const int q = pos + o;
+      if (q < 0 || q >= n) continue;
+      const int k = kKernel[o < 0 ? -o : o];
+      if (!kMasked || mask[static_cast<size_t>(q) * along_px] == 1) {
+        const unsigned char* p = src + static_cast<size_t>(q) * along_px * 3;
+        sum[0] += p[0] * k;
+        sum[1] += p[1] * k;
+        sum[2] += p[2] * k;
+        weight += k;
+      } else {
+        sum[0] += c[0] * 9;
+        sum[1] += c[1] * 9;
+        sum[2] += c[2] * 9;
+        weight += 9;
+      }
+    }
+    unsigned char* d = dst + static_cast<size_t>(pos) * along_px * 3;
+    for (int ch = 0; ch < 3; ++ch) d[ch] = static_cast<unsigned char>(clamp255(((sum[ch] << 10) / weight) >> 10));
+  }
+}
+
+// Horizontal pass into a scratch buffer, then vertical pass into dst.
+template <bool kMasked>
+bool separable_blur(const unsigned char* src, unsigned char* dst, const unsigned char* mask, int w, int h,
+                    Taps taps) {
+  if (!src || !dst || w <= 0 || h <= 0) return false;
+  auto* tmp = static_cast<unsigned char*>(px_malloc(area(w, h), 3));
+  if (!tmp) return false;
+  for (int y = 0; y < h; ++y) {
+    const size_t row = area(w, y);
+    blur_line<kMasked>(src + row * 3, tmp + row * 3, kMasked ? mask + row : nullptr, w, 1, taps);
+  }
+  for (int x = 0; x < w; ++x) {
+    blur_line<kMasked>(tmp + static_cast<size_t>(x) * 3, dst + static_cast<size_t>(x) * 3,
+                       kMasked ? mask + x : nullptr, h, w, taps);
+  }
+  px_free(tmp);
+  return true;
+}
+
+// The reduced picture (and mask) for a full-size picture; owns its buffers.
+struct Reduced {
+  int w = 0, h = 0;
+  unsigned char* pic = nullptr;
+  unsigned char* mask = nullptr;
+  unsigned char* blurred = nullptr;
+  void release() {
+    px_free(pic);
+    px_free(mask);
+    px_free(blurred);
+    pic = mask = blurred = nullptr;
+  }
+};
+
+// Allocates the reduced buffers (blurred one zero-filled); false (all freed)
+// on failure.
+bool allocate(Reduced& r, int width, int height, bool with_mask) {
+  const int k = px_blur_reduction_shift(width, height);
+  r.w = width >> k;
+  r.h = height >> k;
+  const size_t n = area(r.w, r.h);
+  r.pic = static_cast<unsigned char*>(px_malloc(n, 3));
+  r.blurred = static_cast<unsigned char*>(px_calloc(n * 3, 1));
+  r.mask = with_mask ? static_cast<unsigned char*>(px_malloc(n, 1)) : nullptr;
+  if (!r.pic || !r.blurred || (with_mask && !r.mask)) {
+    r.release();
+    return false;
+  }
+  return true;
+}
+
+// The reduced mask; an empty rectangle fills the caller's mask with 1 while
+// it is reduced and with 0 afterwards.
+void reduce_mask(unsigned char* mask, bool whole, int width, int height, const Reduced& r) {
+  if (whole && mask) std::memset(mask, 1, area(width, height));
+  scale_down_depth(mask, width, height, r.mask, r.w, r.h);
+  if (whole && mask) std::memset(mask, 0, area(width, height));
+}
+}  // namespace
+
+int px_blur_all() { return all; }
+
+int px_blur_reduction_shift(int width, int height) {
+  const int m = width > height ? width : height;
+  int k = m > 3250 ? 4 : m > 1650 ? 3 : m > 850 ? 2 : m > 420 ? 1 : 0;
+  // A very thin picture is reduced less, so that no reduced side is empty.
+  while (k > 0 && ((width >> k) < 1 || (height >> k) < 1)) --k;
+  return k;
+}
+
+void scale_down_img(const int* src, int width, int height, unsigned char* dst, int dstWidth, int dstHeight) {
+  if (!src || !dst || width <= 0 || height <= 0 || dstWidth <= 0 || dstHeight <= 0) return;
+  // Crossed on purpose: along a row the height ratio, between rows the width
+  // ratio (equal for the reduced sizes of px_blur_reduction_shift).
+  const int stepX = height / dstHeight;
+  const int stepY = width / dstWidth;
+  if (stepX <= 0 || stepY <= 0) return;
+  int count = width / (width / dstWidth);
+  if (count > dstWidth) count = dstWidth;
+  for (int r = 0; r < dstHeight; ++r) {
+    int sy = static_cast<int>(static_cast<int64_t>(r) * stepY < height ? r * stepY : height - 1);
+    const int* row = src + area(width, sy);
+    unsigned char* out = dst + area(dstWidth, r) * 3;
+    for (int i = 0; i < count; ++i) {
+      const int64_t sx64 = static_cast<int64_t>(i) * stepX;
+      const auto v = static_cast<uint32_t>(row[sx64 < width ? sx64 : width - 1]);
+      out[3 * i] = static_cast<unsigned char>(v >> 16);
+      out[3 * i + 1] = static_cast<unsigned char>(v >> 8);
+      out[3 * i + 2] = static_cast<unsigned char>(v);
+    }
+    std::memset(out + 3 * count, 0, static_cast<size_t>(dstWidth - count) * 3);
+  }
+}
+
+void scale_down_depth(const unsigned char* src, int width, int height, unsigned char* dst, int dstWidth,
+                      int dstHeight) {
+  if (!dst || width <= 0 || height <= 0 || dstWidth <= 0 || dstHeight <= 0) return;
+  const int stepX = height / dstHeight;
+  const int stepY = width / dstWidth;
+  if (stepX <= 0 || stepY <= 0) return;
+  int count = width / (width / dstWidth);
+  if (count > dstWidth) count = dstWidth;
+  for (int r = 0; r < dstHeight; ++r) {
+    int sy = static_cast<int>(static_cast<int64_t>(r) * stepY < height ? r * stepY : height - 1);
+    unsigned char* out = dst + area(dstWidth, r);
+    for (int i = 0; i < count; ++i) {
+      const int64_t sx64 = static_cast<int64_t>(i) * stepX;
+      out[i] = src ? src[area(width, sy) + (sx64 < width ? sx64 : width - 1)] : 1;
+    }
+    std::memset(out + count, 0, static_cast<size_t>(dstWidth - count));
+  }
+}
+
+bool make_gaussian_blur(const unsigned char* src, unsigned char* dst, const unsigned char* mask, int w, int h,
+                        int level) {
+  if (!mask) return false;
+  return separable_blur<true>(src, dst, mask, w, h, taps_of(level));
+}
+
+bool make_tiltshift(const unsigned char* src, unsigned char* dst, int w, int h) {
+  return separable_blur<false>(src, dst, nullptr, w, h, Taps{-4, 5});
+}
+
+void run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
+              const unsigned char* reducedMask, int* dst, int width, int height, int w, int h) {
+  if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
+  const int64_t stepY = step_of(h, height);
+  const int64_t stepX = step_of(w, width);
+  const bool whole = all != 0;
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const Sample sy = sample(y, stepY, h);
+      const size_t row = area(width, y);
+      for (int x = 0; x < width; ++x) {
+        const size_t i = row + x;
+        const auto s = static_cast<uint32_t>(src[i]);
+        if (!whole && mask && mask[i] != 1) {
+          dst[i] = src[i];
+          continue;
+        }
+        const Sample sx = sample(x, stepX, w);
+        const size_t corner[4] = {area(w, sy.i0) + sx.i0, area(w, sy.i0) + sx.i1, area(w, sy.i1) + sx.i0,
+                                  area(w, sy.i1) + sx.i1};
+        int ch[3];
+        for (int c = 0; c < 3; ++c) {
+          const int own = static_cast<int>((s >> (16 - 8 * c)) & 255);
+          int p[4];
+          for (int k = 0; k < 4; ++k) p[k] = reducedMask[corner[k]] == 1 ? blurred[corner[k] * 3 + c] : own;
+          const int top = p[0] * (32 - sx.f) + p[1] * sx.f;
+          const int bottom = p[2] * (32 - sx.f) + p[3] * sx.f;
+          ch[c] = (top * (32 - sy.f) + bottom * sy.f) >> 10;
+        }
+        dst[i] = static_cast<int>((s & 0xFF000000u) | static_cast<uint32_t>(ch[0]) << 16 |
+                                  static_cast<uint32_t>(ch[1]) << 8 | static_cast<uint32_t>(ch[2]));
+      }
+    }
+  });
+}
+
+void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+                       int center, int halfBand) {
+  if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
+  const int64_t stepY = step_of(h, height);
+  const int64_t stepX = step_of(w, width);
+  // Half the distance from the band's edge to the farther picture edge. A
+  // band reaching that edge would make it 0 (or less): it is taken as 1, so
+  // the band is sharp and any row beyond it fully blurred.
+  int64_t d = static_cast<int64_t>(height) - center < center
+                  ? (static_cast<int64_t>(center) - halfBand) >> 1
+                  : (static_cast<int64_t>(height) - center - halfBand) >> 1;
+  if (d < 1) d = 1;
+  const int64_t k = d > 0x100000 ? 0 : (0x100000 / d) * 256;
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      int64_t beyond = (y > center ? static_cast<int64_t>(y) - center : static_cast<int64_t>(center) - y) - halfBand;
+      if (beyond < 0) beyond = 0;
+      int64_t a64 = ((d - beyond) * k) >> 20;
+      const int a = a64 < 0 ? 0 : static_cast<int>(a64);
+      const Sample sy = sample(y, stepY, h);
+      const size_t row = area(width, y);
+      for (int x = 0; x < width; ++x) {
+        const size_t i = row + x;
+        const auto s = static_cast<uint32_t>(src[i]);
+        const Sample sx = sample(x, stepX, w);
+        const unsigned char* p00 = blurred + (area(w, sy.i0) + sx.i0) * 3;
+        const unsigned char* p01 = blurred + (area(w, sy.i0) + sx.i1) * 3;
+        const unsigned char* p10 = blurred + (area(w, sy.i1) + sx.i0) * 3;
+        const unsigned char* p11 = blurred + (area(w, sy.i1) + sx.i1) * 3;
+        uint32_t out = s & 0xFF000000u;
+        for (int c = 0; c < 3; ++c) {
+          const int top = p00[c] * (32 - sx.f) + p01[c] * sx.f;
+          const int bottom = p10[c] * (32 - sx.f) + p11[c] * sx.f;
+          int b = (top * (32 - sy.f) + bottom * sy.f) >> 10;
+          if (b > 255) b = 255;
+          const int own = static_cast<int>((s >> (16 - 8 * c)) & 255);
+          out |= static_cast<uint32_t>(clamp255((b * (256 - a) + own * a) >> 8)) << (16 - 8 * c);
+        }
+        dst[i] = static_cast<int>(out);
+      }
+    }
+  });
+}
+
+// ---- selective blur -----------------------------------------------------------
+
+int px_Init_blur(const int* src, unsigned char* mask, int width, int height, int left, int right, int top,
+                 int bottom) {
+  px_destroy_blur();
+  if (!src || width <= 0 || height <= 0) return PX_ERR_NULL;
+  const bool whole = is_empty(left, right, top, bottom);
+  all = whole ? 1 : 0;
+  Reduced r;
+  if (!allocate(r, width, height, true)) return PX_ERR_ALLOC;
+  scale_down_img(src, width, height, r.pic, r.w, r.h);
+  reduce_mask(mask, whole, width, height, r);
+  g_ssrc = r.pic;
+  g_tempd = r.mask;
+  g_sblur = r.blurred;
+  g_scaled_wd = r.w;
+  g_scaled_ht = r.h;
+  return PX_OK;
+}
+
+void px_make_blur_preview(const int* src, const unsigned char* mask, int* dst, int width, int height, int level) {
+  if (!g_ssrc || !g_tempd || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
+  if (!make_gaussian_blur(g_ssrc, g_sblur, g_tempd, g_scaled_wd, g_scaled_ht, level)) return;
+  run_blur(src, g_sblur, mask, g_tempd, dst, width, height, g_scaled_wd, g_scaled_ht);
+}
+
+int px_make_blur(const int* src, unsigned char* mask, int* dst, int width, int height, int level, int left,
+                 int right, int top, int bottom) {
+  if (!src || !dst || width <= 0 || height <= 0) return PX_ERR_NULL;
+  const bool whole = is_empty(left, right, top, bottom);
+  Reduced r;
+  if (!allocate(r, width, height, true)) return PX_ERR_ALLOC;
+  if (whole && mask) std::memset(mask, 1, area(width, height));
+  scale_down_img(src, width, height, r.pic, r.w, r.h);
+  scale_down_depth(mask, width, height, r.mask, r.w, r.h);
+  int rc = PX_ERR_ALLOC;
+  if (make_gaussian_blur(r.pic, r.blurred, r.mask, r.w, r.h, level)) {
+    run_blur(src, r.blurred, mask, r.mask, dst, width, height, r.w, r.h);
+    rc = PX_OK;
+  }
+  r.release();
+  if (whole && mask) std::memset(mask, 0, area(width, height));
+  return rc;
+}
+
+void px_destroy_blur() {
+  px_free(g_ssrc);
+  px_free(g_tempd);
+  px_free(g_sblur);
+  g_ssrc = g_tempd = g_sblur = nullptr;
+}
+
+// ---- tilt-shift -----------------------------------------------------------------
+
+int px_init_tiltshift(const int* src, int width, int height) {
+  px_destroy_blur();
+  if (!src || width <= 0 || height <= 0) return PX_ERR_NULL;
+  Reduced r;
+  if (!allocate(r, width, height, false)) return PX_ERR_ALLOC;
+  resize_ratio = px_blur_reduction_shift(width, height);
+  scale_down_img(src, width, height, r.pic, r.w, r.h);
+  g_ssrc = r.pic;
+  g_sblur = r.blurred;
+  g_scaled_wd = r.w;
+  g_scaled_ht = r.h;
+  return PX_OK;
+}
+
+void px_tiltshift_preview(const int* src, int* dst, int width, int height, int center, int halfBand) {
+  if (!g_ssrc || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
+  if (!make_tiltshift(g_ssrc, g_sblur, g_scaled_wd, g_scaled_ht)) return;
+  restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);
+}
+
+int px_apply_tiltshift(const int* src, int* dst, int width, int height, int center, int halfBand) {
+  if (!src || !dst || width <= 0 || height <= 0) return PX_ERR_NULL;
+  Reduced r;
+  if (!allocate(r, width, height, false)) return PX_ERR_ALLOC;
+  scale_down_img(src, width, height, r.pic, r.w, r.h);
+  const bool blurred = make_tiltshift(r.pic, r.blurred, r.w, r.h);
+  px_free(r.pic);
+  r.pic = nullptr;
+  if (blurred) restore_tiltshift(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand);
+  r.release();
+  return blurred ? PX_OK : PX_ERR_ALLOC;
+}
+
+int px_apply_miniature(const int* src, int* dst, int width, int height) {
+  if (!src || !dst || width <= 0 || height <= 0) return PX_ERR_NULL;
+  px_control_saturation_all(const_cast<int*>(src), dst, width, height, 16);
+  return px_apply_tiltshift(dst, dst, width, height, height >> 1, height >> 3);
+}
+
+void px_destroy_tiltshift() {
+  px_free(g_ssrc);
+  px_free(g_sblur);
+  g_ssrc = g_sblur = nullptr;
+}
+
+// ---- out-focus ---------------------------------------------------------------------
+
+int px_blur_outfocus(int* src, int* dst, int width, int height, int level) {
+  int radius = kOutfocusRadius[level < 0 ? 0 : (level > 7 ? 7 : level)];
+  structIELImage in{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(src)};
+  structIELImage out{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(dst)};
+  structIELEffectParams params{IEL_EFFECT_VARIABLE_BLUR, &radius, nullptr, 0, 0};
+  return IEL_Apply_Effect(&in, &out, &params);
+}
