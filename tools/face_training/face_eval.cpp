@@ -103,7 +103,7 @@ int main(int argc, char** argv) {
   Tally eng, engRot, th, tl, sceneOnly;
   size_t next = 0;
   int photos = 0;
-  for (size_t i = 0; i < scenes.size(); i += 5) {
+  for (size_t i = 0; i < scenes.size() && !std::getenv("FACE_EVAL_LANDMARKS_ONLY"); i += 5) {
     cv::Mat scene = cv::imread(scenes[i], cv::IMREAD_COLOR);
     if (scene.empty()) continue;
     double k = 640.0 / std::max(scene.cols, scene.rows);
@@ -165,7 +165,9 @@ int main(int argc, char** argv) {
 
   // Eyes and mouth on held-out landmark faces (photo 80 x 80, analysed whole).
   int n = 0, faceFound = 0, eyesFound = 0, eyesWithin = 0, mouthFound = 0, mouthWithin = 0;
-  double eyeErr = 0, mouthErr = 0;
+  double sd[4] = {}, e1 = 0, e2 = 0;
+  double eyeErr = 0, mouthErr = 0, boxScale = 0, boxDx = 0, boxDy = 0;
+  const bool landmarksOnly = std::getenv("FACE_EVAL_LANDMARKS_ONLY") != nullptr;
   for (size_t i = 0; i < test.size(); ++i) {
     const LandmarkFace& f = test[i];
     cv::Mat img = cv::imread(f.path, cv::IMREAD_COLOR);
@@ -183,11 +185,17 @@ int main(int argc, char** argv) {
     }
     if (best >= 0) {
       ++faceFound;
+      const caFaceBox& fb = info.faceRect[best];
+      boxScale += fb.width / truth.width;
+      boxDx += (fb.x + fb.width / 2.0 - truth.x - truth.width / 2) / truth.width;
+      boxDy += (fb.y + fb.height / 2.0 - truth.y - truth.height / 2) / truth.width;
       const caEyePair& e = info.eyePoints[best];
       if (e.x1 >= 0 && e.x2 >= 0) {
         ++eyesFound;
         double err = std::max(std::hypot(e.x1 - f.x[0], e.y1 - f.y[0]), std::hypot(e.x2 - f.x[1], e.y2 - f.y[1])) / d;
         eyeErr += err;
+        sd[0] += (e.x1 - f.x[0]) / d, sd[1] += (e.y1 - f.y[0]) / d, sd[2] += (e.x2 - f.x[1]) / d, sd[3] += (e.y2 - f.y[1]) / d;
+        e1 += std::hypot(e.x1 - f.x[0], e.y1 - f.y[0]) / d, e2 += std::hypot(e.x2 - f.x[1], e.y2 - f.y[1]) / d;
         eyesWithin += err <= 0.1;
         const SMyPoint2& m = info.mouthCenter[best];
         if (info.mouthRect[best].width > 0) {
@@ -201,10 +209,16 @@ int main(int argc, char** argv) {
     ReleaseFaceBeautyPlus(&info);
   }
   std::printf("\nHeld-out landmark faces: %d; face found %d (%.3f)\n", n, faceFound, double(faceFound) / n);
+  std::printf("detected box against the landmark box: width ratio %.3f, centre offset (%.3f, %.3f) widths\n",
+              boxScale / std::max(1, faceFound), boxDx / std::max(1, faceFound), boxDy / std::max(1, faceFound));
   std::printf("eyes found in %d of the found faces (%.3f); worse eye error: mean %.3f of the eye distance, "
               "%d (%.3f) within 0.10\n",
               eyesFound, double(eyesFound) / std::max(1, faceFound), eyeErr / std::max(1, eyesFound), eyesWithin,
               double(eyesWithin) / std::max(1, eyesFound));
+  std::printf("signed mean eye offsets (eye distances): first (%.3f, %.3f), second (%.3f, %.3f); mean error first %.3f, "
+              "second %.3f\n",
+              sd[0] / std::max(1, eyesFound), sd[1] / std::max(1, eyesFound), sd[2] / std::max(1, eyesFound),
+              sd[3] / std::max(1, eyesFound), e1 / std::max(1, eyesFound), e2 / std::max(1, eyesFound));
   std::printf("mouth found in %d faces with eyes; centre error mean %.3f of the eye distance, %d (%.3f) within 0.20\n",
               mouthFound, mouthErr / std::max(1, mouthFound), mouthWithin, double(mouthWithin) / std::max(1, mouthFound));
   return 0;

@@ -17,6 +17,7 @@
 #include "common.h"
 #include "effect/face/ed_md_detector.h"
 #include "effect/face/face_engine.h"
+#include "effect/face/fd_detector.h"
 #include "effect/face/sm_image.h"
 
 namespace {
@@ -433,25 +434,42 @@ int main(int argc, char** argv) {
     Samples pos;
     pos.P = sp.px.size();
     std::vector<Level> levels;
+    int missed = 0;
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
       for (int m = 0; m < 2; ++m) {
         const cv::Mat& g0 = m ? fl : greys[i];
         Pts p = points(faces[i], m, g0.cols);
-        // The analyser enlarges small photos: emulate a working image 1 to 4 times larger.
-        int f = 1 + static_cast<int>(rng() % 4);
-        std::vector<uint8_t> g(g0.cols * f * g0.rows * f);
-        int gw = g0.cols * f, gh = g0.rows * f;
+        // The analyser's working image, and the face box its detector finds
+        // there (the detected boxes run smaller than the landmark box and
+        // sit higher: where the detector misses, that bias is imitated).
+        int gw, gh;
+        caIF_WorkingSize(g0.cols, g0.rows, &gw, &gh);
+        std::vector<uint8_t> g(gw * gh);
         Resize_NN(g0.data, g0.cols, g0.rows, g.data(), gw, gh);
+        const double f = double(gw) / g0.cols;
         auto sc = [f](double v) { return v * f + (f - 1) / 2.0; };
         cv::Rect2d fb = face_box_from_eyes(sc(p.lx), sc(p.ly), sc(p.rx), sc(p.ry));
-        double js = uni(0.9, 1.1), jx = uni(-0.06, 0.06) * fb.width, jy = uni(-0.06, 0.06) * fb.width;
-        double cx = fb.x + fb.width / 2 + jx, cy = fb.y + fb.height / 2 + jy;
-        double bw = fb.width * js, bh = fb.height * js;
-        SMyRect2 box{static_cast<int>(cx - bw / 2), static_cast<int>(cy - bh / 2), 0, 0};
-        box.right = box.left + static_cast<int>(bw);
-        box.bottom = box.top + static_cast<int>(bh);
+        SMyRect2 box{};
+        int found = fd_find(g.data(), gw, gh, 0, 0, 3);
+        SMyRect2 boxes[kFdListSize];
+        double bestIou = 0.3;
+        if (found > 0 && fd_where(boxes))
+          for (int k = 0; k < found; ++k) {
+            cv::Rect2d d(boxes[k].left, boxes[k].top, boxes[k].right - boxes[k].left, boxes[k].bottom - boxes[k].top);
+            double in = (d & fb).area(), u = in / (d.area() + fb.area() - in);
+            if (u >= bestIou) bestIou = u, box = boxes[k];
+          }
+        if (bestIou == 0.3) {
+          ++missed;
+          double js = uni(0.8, 0.92), jx = uni(-0.11, -0.02) * fb.width, jy = uni(-0.12, -0.04) * fb.width;
+          double cx = fb.x + fb.width / 2 + jx, cy = fb.y + fb.height / 2 + jy;
+          double bw = fb.width * js, bh = fb.height * js;
+          box = SMyRect2{static_cast<int>(cx - bw / 2), static_cast<int>(cy - bh / 2), 0, 0};
+          box.right = box.left + static_cast<int>(bw);
+          box.bottom = box.top + static_cast<int>(bh);
+        }
         for (int side = 0; side < (eye ? 2 : 1); ++side) {
           SMyRect2 r;
           double tx, ty;
@@ -493,8 +511,8 @@ int main(int argc, char** argv) {
         }
       }
     }
-    std::fprintf(report, "%s: %zu positive windows, %zu region levels (%.0f s)\n", sp.name, pos.size(), levels.size(),
-                 now() - t0);
+    std::fprintf(report, "%s: %zu positive windows, %zu region levels, detector missed %d faces (%.0f s)\n", sp.name,
+                 pos.size(), levels.size(), missed, now() - t0);
     const int tol = 3;
     auto cascade = train_cascade(
         sp, pos, levels, 1,
