@@ -1,0 +1,72 @@
+#include "common.h"
+
+#include <dirent.h>
+
+#include <algorithm>
+#include <cmath>
+#include <fstream>
+#include <map>
+#include <opencv2/imgcodecs.hpp>
+#include <sstream>
+
+std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list) {
+  std::map<std::string, bool> good;
+  std::ifstream tc(root + "/teacher_check.tsv");
+  std::string line;
+  while (std::getline(tc, line)) {
+    if (line.empty() || line[0] == '#') continue;
+    std::istringstream ss(line);
+    std::string p, a, b;
+    std::getline(ss, p, '\t');
+    std::getline(ss, a, '\t');
+    std::getline(ss, b, '\t');
+    good[p] = b == "1";
+  }
+  std::vector<LandmarkFace> out;
+  std::ifstream in(root + "/" + list);
+  while (std::getline(in, line)) {
+    std::istringstream ss(line);
+    LandmarkFace f;
+    ss >> f.path;
+    for (float& v : f.x) ss >> v;
+    for (float& v : f.y) ss >> v;
+    if (!ss || !good[f.path]) continue;
+    for (char& c : f.path)
+      if (c == '\\') c = '/';
+    f.path = root + "/" + f.path;
+    out.push_back(f);
+  }
+  return out;
+}
+
+cv::Mat load_grey(const std::string& path) {
+  cv::Mat bgr = cv::imread(path, cv::IMREAD_COLOR);
+  if (bgr.empty()) return bgr;
+  cv::Mat g(bgr.rows, bgr.cols, CV_8UC1);
+  for (int y = 0; y < bgr.rows; ++y)
+    for (int x = 0; x < bgr.cols; ++x) {
+      cv::Vec3b p = bgr.at<cv::Vec3b>(y, x);
+      g.at<uint8_t>(y, x) = static_cast<uint8_t>((p[0] + p[1] + p[2]) / 3);
+    }
+  return g;
+}
+
+std::vector<std::string> list_images(const std::string& dir) {
+  std::vector<std::string> out;
+  if (DIR* d = opendir(dir.c_str())) {
+    while (dirent* e = readdir(d)) {
+      std::string n = e->d_name;
+      if (n.size() > 4 && (n.ends_with(".jpg") || n.ends_with(".png") || n.ends_with(".jpeg")))
+        out.push_back(dir + "/" + n);
+    }
+    closedir(d);
+  }
+  std::sort(out.begin(), out.end());
+  return out;
+}
+
+cv::Rect2d face_box_from_eyes(double lx, double ly, double rx, double ry) {
+  double d = std::hypot(rx - lx, ry - ly), s = d / kEyeDist;
+  double mx = (lx + rx) / 2, my = (ly + ry) / 2;
+  return cv::Rect2d(mx - kEyeMidX * s, my - kEyeMidY * s, 22 * s, 24 * s);
+}

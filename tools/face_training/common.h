@@ -1,0 +1,24 @@
+// Shared pieces of the face training and evaluation tools: data loading and
+// the canonical face geometry relating landmarks to detector boxes.
+#pragma once
+
+#include <opencv2/core.hpp>
+#include <string>
+#include <vector>
+
+struct LandmarkFace {
+  std::string path;
+  float x[5], y[5];  // left eye, right eye, nose, left mouth corner, right mouth corner
+};
+
+// Rows of an MTFL list whose landmarks were confirmed by the teacher check.
+std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list);
+// Grey (R + G + B) / 3 image, as the engine sees it.
+cv::Mat load_grey(const std::string& path);
+std::vector<std::string> list_images(const std::string& dir);
+
+// Canonical face window: 22 x 24 pixels, eye distance 10, eye midpoint at
+// (11, 7). A detector box for a face is this window scaled onto the face.
+constexpr double kEyeDist = 10.0, kEyeMidX = 11.0, kEyeMidY = 7.0;
+// Face box (left, top, right, bottom) implied by the eye centres.
+cv::Rect2d face_box_from_eyes(double lx, double ly, double rx, double ry);

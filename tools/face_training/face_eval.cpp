@@ -1,0 +1,225 @@
+// Measures the face engine with the shipped tables on held-out data:
+//  - composite photos: held-out landmark faces pasted at several sizes into
+//    held-out scene photos; recall and false positives at IoU >= 0.3, beside
+//    OpenCV's Haar and LBP frontal cascades when their files are installed;
+//  - eye and mouth localisation error on held-out landmark faces, as a
+//    fraction of the eye distance.
+// Usage: face_eval DATA_DIR [OPENCV_DATA_DIR]
+#include <algorithm>
+#include <chrono>
+#include <cmath>
+#include <cstdlib>
+#include <cstdio>
+#include <opencv2/imgcodecs.hpp>
+#include <opencv2/imgproc.hpp>
+#include <opencv2/objdetect.hpp>
+#include <random>
+
+#include "common.h"
+#include "effect/face/face_engine.h"
+
+namespace {
+double now() {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now().time_since_epoch()).count();
+}
+
+std::vector<int> to_argb(const cv::Mat& bgr) {
+  std::vector<int> p(bgr.rows * bgr.cols);
+  for (int y = 0; y < bgr.rows; ++y)
+    for (int x = 0; x < bgr.cols; ++x) {
+      cv::Vec3b v = bgr.at<cv::Vec3b>(y, x);
+      p[y * bgr.cols + x] = static_cast<int>(0xFF000000u | v[2] << 16 | v[1] << 8 | v[0]);
+    }
+  return p;
+}
+
+double iou(const cv::Rect2d& a, const cv::Rect2d& b) {
+  double in = (a & b).area();
+  return in / (a.area() + b.area() - in);
+}
+
+struct Tally {
+  int faces = 0, found = 0, fp = 0;
+  double seconds = 0;
+  void add(const std::vector<cv::Rect2d>& truth, const std::vector<cv::Rect2d>& det) {
+    std::vector<bool> used(det.size());
+    faces += truth.size();
+    for (const auto& t : truth) {
+      int best = -1;
+      double bi = 0.3;
+      for (size_t k = 0; k < det.size(); ++k)
+        if (!used[k] && iou(t, det[k]) >= bi) bi = iou(t, det[k]), best = k;
+      if (best >= 0) used[best] = true, ++found;
+    }
+    for (bool u : used) fp += !u;
+  }
+};
+
+std::vector<cv::Rect2d> run_engine(const cv::Mat& bgr, int mode, FaceEngineInfo* out = nullptr) {
+  FaceEngineInfo info{};
+  InitFaceBeautyPlus(&info, mode, 20, 1, 16, 3, 0);
+  std::vector<int> argb = to_argb(bgr);
+  RunFaceAnalyzer(&info, argb.data(), bgr.cols, bgr.rows);
+  std::vector<cv::Rect2d> r;
+  for (int i = 0; i < info.faceCount; ++i)
+    r.emplace_back(info.faceRect[i].x, info.faceRect[i].y, info.faceRect[i].width, info.faceRect[i].height);
+  if (out)
+    *out = info;
+  else
+    ReleaseFaceBeautyPlus(&info);
+  return r;
+}
+
+std::vector<cv::Rect2d> run_cv(cv::CascadeClassifier& c, const cv::Mat& bgr) {
+  cv::Mat g;
+  cv::cvtColor(bgr, g, cv::COLOR_BGR2GRAY);
+  std::vector<cv::Rect> f;
+  c.detectMultiScale(g, f, 1.1, 3, 0, cv::Size(20, 20));
+  return std::vector<cv::Rect2d>(f.begin(), f.end());
+}
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (argc == 5 && std::string(argv[1]) == "--pgm") {  // face_eval --pgm IN OUT LONGER_SIDE: test pictures
+    cv::Mat g = load_grey(argv[2]);
+    double k = std::atof(argv[4]) / std::max(g.cols, g.rows);
+    cv::resize(g, g, cv::Size(), k, k, cv::INTER_AREA);
+    return cv::imwrite(argv[3], g) ? 0 : 1;
+  }
+  if (argc < 2) {
+    std::fprintf(stderr, "usage: face_eval DATA_DIR [OPENCV_DATA_DIR]\n");
+    return 2;
+  }
+  const std::string data = argv[1];
+  const std::string cvdir = argc > 2 ? argv[2] : "/usr/share/opencv4";
+  std::mt19937 rng(7);
+  std::vector<LandmarkFace> test = load_landmarks(data, "new_testing.txt");
+  std::vector<std::string> scenes = list_images(data + "/images_notfaces");
+  cv::CascadeClassifier haar, lbp;
+  bool haveCv = haar.load(cvdir + "/haarcascades/haarcascade_frontalface_default.xml") &&
+                lbp.load(cvdir + "/lbpcascades/lbpcascade_frontalface_improved.xml");
+
+  // Composite photos from the held-out scenes (every fifth) and faces.
+  Tally eng, engRot, th, tl, sceneOnly;
+  size_t next = 0;
+  int photos = 0;
+  for (size_t i = 0; i < scenes.size() && !std::getenv("FACE_EVAL_LANDMARKS_ONLY"); i += 5) {
+    cv::Mat scene = cv::imread(scenes[i], cv::IMREAD_COLOR);
+    if (scene.empty()) continue;
+    double k = 640.0 / std::max(scene.cols, scene.rows);
+    cv::resize(scene, scene, cv::Size(), k, k, cv::INTER_AREA);
+    sceneOnly.add({}, run_engine(scene, 1));
+    std::vector<cv::Rect2d> truth;
+    std::vector<cv::Rect> placed;
+    for (int n = 0; n < 3 && next < test.size(); ++n) {
+      const LandmarkFace& f = test[next++];
+      cv::Mat face = cv::imread(f.path, cv::IMREAD_COLOR);
+      if (face.empty()) continue;
+      int size = 60 + static_cast<int>(rng() % 140);
+      if (size >= std::min(scene.cols, scene.rows)) continue;
+      double s = double(size) / face.cols;
+      cv::Mat fs;
+      cv::resize(face, fs, cv::Size(size, size), 0, 0, cv::INTER_AREA);
+      cv::Rect at;
+      bool ok = false;
+      for (int tries = 0; tries < 50 && !ok; ++tries) {
+        at = cv::Rect(rng() % (scene.cols - size), rng() % (scene.rows - size), size, size);
+        ok = true;
+        for (const auto& p : placed) ok &= (p & at).area() == 0;
+      }
+      if (!ok) continue;
+      placed.push_back(at);
+      fs.copyTo(scene(at));
+      cv::Rect2d fb = face_box_from_eyes(f.x[0] * s, f.y[0] * s, f.x[1] * s, f.y[1] * s);
+      truth.emplace_back(fb.x + at.x, fb.y + at.y, fb.width, fb.height);
+    }
+    ++photos;
+    double t0 = now();
+    eng.add(truth, run_engine(scene, 1));
+    eng.seconds += now() - t0;
+    t0 = now();
+    engRot.add(truth, run_engine(scene, 3));
+    engRot.seconds += now() - t0;
+    if (haveCv) {
+      t0 = now();
+      th.add(truth, run_cv(haar, scene));
+      th.seconds += now() - t0;
+      t0 = now();
+      tl.add(truth, run_cv(lbp, scene));
+      tl.seconds += now() - t0;
+    }
+  }
+  std::printf("Composite photos: %d (held-out scenes, longer side 640, held-out faces 60..200 px)\n", photos);
+  std::printf("| detector | faces | found | recall | false positives | ms per photo |\n|---|---|---|---|---|---|\n");
+  auto row = [&](const char* name, const Tally& t) {
+    std::printf("| %s | %d | %d | %.3f | %d | %.1f |\n", name, t.faces, t.found, t.faces ? double(t.found) / t.faces : 0.0,
+                t.fp, 1000 * t.seconds / std::max(1, photos));
+  };
+  row("engine, upright (mode 1)", eng);
+  row("engine, upright and +-45 (mode 3)", engRot);
+  if (haveCv) {
+    row("OpenCV haarcascade_frontalface_default", th);
+    row("OpenCV lbpcascade_frontalface_improved", tl);
+  }
+  std::printf("False positives on the %d held-out scenes alone (engine, mode 1): %d\n", photos, sceneOnly.fp);
+
+  // Eyes and mouth on held-out landmark faces (photo 80 x 80, analysed whole).
+  int n = 0, faceFound = 0, eyesFound = 0, eyesWithin = 0, mouthFound = 0, mouthWithin = 0;
+  double sd[4] = {}, e1 = 0, e2 = 0;
+  double eyeErr = 0, mouthErr = 0, boxScale = 0, boxDx = 0, boxDy = 0;
+  const bool landmarksOnly = std::getenv("FACE_EVAL_LANDMARKS_ONLY") != nullptr;
+  for (size_t i = 0; i < test.size(); ++i) {
+    const LandmarkFace& f = test[i];
+    cv::Mat img = cv::imread(f.path, cv::IMREAD_COLOR);
+    if (img.empty()) continue;
+    ++n;
+    FaceEngineInfo info{};
+    run_engine(img, 1, &info);
+    double d = std::hypot(f.x[1] - f.x[0], f.y[1] - f.y[0]);
+    cv::Rect2d truth = face_box_from_eyes(f.x[0], f.y[0], f.x[1], f.y[1]);
+    int best = -1;
+    double bi = 0.3;
+    for (int k = 0; k < info.faceCount; ++k) {
+      cv::Rect2d r(info.faceRect[k].x, info.faceRect[k].y, info.faceRect[k].width, info.faceRect[k].height);
+      if (iou(truth, r) >= bi) bi = iou(truth, r), best = k;
+    }
+    if (best >= 0) {
+      ++faceFound;
+      const caFaceBox& fb = info.faceRect[best];
+      boxScale += fb.width / truth.width;
+      boxDx += (fb.x + fb.width / 2.0 - truth.x - truth.width / 2) / truth.width;
+      boxDy += (fb.y + fb.height / 2.0 - truth.y - truth.height / 2) / truth.width;
+      const caEyePair& e = info.eyePoints[best];
+      if (e.x1 >= 0 && e.x2 >= 0) {
+        ++eyesFound;
+        double err = std::max(std::hypot(e.x1 - f.x[0], e.y1 - f.y[0]), std::hypot(e.x2 - f.x[1], e.y2 - f.y[1])) / d;
+        eyeErr += err;
+        sd[0] += (e.x1 - f.x[0]) / d, sd[1] += (e.y1 - f.y[0]) / d, sd[2] += (e.x2 - f.x[1]) / d, sd[3] += (e.y2 - f.y[1]) / d;
+        e1 += std::hypot(e.x1 - f.x[0], e.y1 - f.y[0]) / d, e2 += std::hypot(e.x2 - f.x[1], e.y2 - f.y[1]) / d;
+        eyesWithin += err <= 0.1;
+        const SMyPoint2& m = info.mouthCenter[best];
+        if (info.mouthRect[best].width > 0) {
+          ++mouthFound;
+          double me = std::hypot(m.x - (f.x[3] + f.x[4]) / 2, m.y - (f.y[3] + f.y[4]) / 2) / d;
+          mouthErr += me;
+          mouthWithin += me <= 0.2;
+        }
+      }
+    }
+    ReleaseFaceBeautyPlus(&info);
+  }
+  std::printf("\nHeld-out landmark faces: %d; face found %d (%.3f)\n", n, faceFound, double(faceFound) / n);
+  std::printf("detected box against the landmark box: width ratio %.3f, centre offset (%.3f, %.3f) widths\n",
+              boxScale / std::max(1, faceFound), boxDx / std::max(1, faceFound), boxDy / std::max(1, faceFound));
+  std::printf("eyes found in %d of the found faces (%.3f); worse eye error: mean %.3f of the eye distance, "
+              "%d (%.3f) within 0.10\n",
+              eyesFound, double(eyesFound) / std::max(1, faceFound), eyeErr / std::max(1, eyesFound), eyesWithin,
+              double(eyesWithin) / std::max(1, eyesFound));
+  std::printf("signed mean eye offsets (eye distances): first (%.3f, %.3f), second (%.3f, %.3f); mean error first %.3f, "
+              "second %.3f\n",
+              sd[0] / std::max(1, eyesFound), sd[1] / std::max(1, eyesFound), sd[2] / std::max(1, eyesFound),
+              sd[3] / std::max(1, eyesFound), e1 / std::max(1, eyesFound), e2 / std::max(1, eyesFound));
+  std::printf("mouth found in %d faces with eyes; centre error mean %.3f of the eye distance, %d (%.3f) within 0.20\n",
+              mouthFound, mouthErr / std::max(1, mouthFound), mouthWithin, double(mouthWithin) / std::max(1, mouthFound));
+  return 0;
+}

@@ -1,0 +1,531 @@
+// Trains the face, eye and mouth cascades: boosted 511-entry look-up tables
+// over census codes, cut from the pictures exactly as the detectors see them
+// at run time, with hard negatives mined by the stages trained so far.
+// Writes jni/effect/face/models/*.cpp. Usage: face_train DATA_DIR OUT_DIR
+#include <algorithm>
+#include <chrono>
+#include <climits>
+#include <cmath>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <functional>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "common.h"
+#include "effect/face/ed_md_detector.h"
+#include "effect/face/face_engine.h"
+#include "effect/face/fd_detector.h"
+#include "effect/face/sm_image.h"
+
+namespace {
+std::mt19937 rng(20240611);
+double uni(double a, double b) { return std::uniform_real_distribution<double>(a, b)(rng); }
+
+double now() {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now().time_since_epoch()).count();
+}
+
+// A detector's window geometry and stage layout.
+struct Spec {
+  const char* name;
+  int ww, wh;                  // window
+  std::vector<int> px, py;     // candidate feature positions inside the window
+  std::vector<int> features;   // per stage
+  std::vector<int> thresholds; // per stage
+  int cap;                     // largest table value (255 for bytes)
+  std::vector<double> keep;    // share of positive windows each stage keeps
+};
+
+struct Stage {
+  std::vector<int> pos;          // position index per feature
+  std::vector<int32_t> table;    // features x 511
+  int threshold;
+};
+
+// Samples: codes at every candidate position, one row per sample.
+struct Samples {
+  int P = 0;
+  std::vector<uint16_t> codes;
+  size_t size() const { return P ? codes.size() / P : 0; }
+  const uint16_t* row(size_t i) const { return codes.data() + i * P; }
+};
+
+void add_window(Samples& s, const Spec& sp, const uint16_t* mct, int lw, int x, int y) {
+  for (size_t p = 0; p < sp.px.size(); ++p) s.codes.push_back(mct[(y + sp.py[p]) * lw + x + sp.px[p]]);
+}
+
+// Stage sums of a sample row (positions indexed) or a window in a level.
+int stage_sum_row(const Stage& st, const uint16_t* row) {
+  int sum = 0;
+  for (size_t f = 0; f < st.pos.size(); ++f) sum += st.table[f * 511 + row[st.pos[f]]];
+  return sum;
+}
+
+bool cascade_row(const std::vector<Stage>& c, const uint16_t* row) {
+  for (const Stage& st : c)
+    if (stage_sum_row(st, row) > st.threshold) return false;
+  return true;
+}
+
+bool cascade_window(const std::vector<Stage>& c, const Spec& sp, const uint16_t* mct, int lw, int x, int y) {
+  for (const Stage& st : c) {
+    int sum = 0;
+    for (size_t f = 0; f < st.pos.size(); ++f) {
+      int p = st.pos[f];
+      sum += st.table[f * 511 + mct[(y + sp.py[p]) * lw + x + sp.px[p]]];
+    }
+    if (sum > st.threshold) return false;
+  }
+  return true;
+}
+
+// Real AdaBoost over per-position look-up tables; returns the stage in
+// real-valued form (h per code), then quantised so that "sum <= threshold"
+// keeps the wanted share of positives.
+Stage train_stage(const Spec& sp, int stageIndex, const Samples& pos, const Samples& neg) {
+  const int P = sp.px.size(), n = sp.features[stageIndex];
+  const size_t np = pos.size(), nn = neg.size(), N = np + nn;
+  // Column-major copy for histogramming.
+  std::vector<uint16_t> col(static_cast<size_t>(P) * N);
+  for (size_t i = 0; i < np; ++i)
+    for (int p = 0; p < P; ++p) col[p * N + i] = pos.row(i)[p];
+  for (size_t i = 0; i < nn; ++i)
+    for (int p = 0; p < P; ++p) col[p * N + np + i] = neg.row(i)[p];
+  std::vector<double> w(N);
+  for (size_t i = 0; i < N; ++i) w[i] = i < np ? 0.5 / np : 0.5 / nn;
+  const double eps = 0.5 / N, clip = 3.0;
+  std::vector<int> chosen;
+  std::vector<std::vector<double>> hs;
+  std::vector<double> Wp(511), Wn(511);
+  for (int r = 0; r < n; ++r) {
+    double bestZ = 1e300;
+    int best = 0;
+    for (int p = 0; p < P; ++p) {
+      std::fill(Wp.begin(), Wp.end(), 0.0);
+      std::fill(Wn.begin(), Wn.end(), 0.0);
+      const uint16_t* c = &col[p * N];
+      for (size_t i = 0; i < np; ++i) Wp[c[i]] += w[i];
+      for (size_t i = np; i < N; ++i) Wn[c[i]] += w[i];
+      double z = 0;
+      for (int k = 0; k < 511; ++k) z += std::sqrt(Wp[k] * Wn[k]);
+      if (z < bestZ) bestZ = z, best = p;
+    }
+    std::fill(Wp.begin(), Wp.end(), 0.0);
+    std::fill(Wn.begin(), Wn.end(), 0.0);
+    const uint16_t* c = &col[best * N];
+    for (size_t i = 0; i < np; ++i) Wp[c[i]] += w[i];
+    for (size_t i = np; i < N; ++i) Wn[c[i]] += w[i];
+    std::vector<double> h(511);
+    for (int k = 0; k < 511; ++k) h[k] = std::clamp(0.5 * std::log((Wp[k] + eps) / (Wn[k] + eps)), -clip, clip);
+    double total = 0;
+    for (size_t i = 0; i < N; ++i) {
+      w[i] *= std::exp((i < np ? -1 : 1) * h[c[i]]);
+      total += w[i];
+    }
+    for (double& v : w) v /= total;
+    chosen.push_back(best);
+    hs.push_back(h);
+  }
+  // Quantise: value = s * (max h - h), so a lower sum is more like the target.
+  const int T = sp.thresholds[stageIndex];
+  std::vector<double> hmax(n);
+  double sumMax = 0;
+  for (int f = 0; f < n; ++f) sumMax += hmax[f] = *std::max_element(hs[f].begin(), hs[f].end());
+  std::vector<double> H(np);
+  for (size_t i = 0; i < np; ++i) {
+    double v = 0;
+    for (int f = 0; f < n; ++f) v += hs[f][pos.row(i)[chosen[f]]];
+    H[i] = v;
+  }
+  std::vector<double> Hs = H;
+  std::sort(Hs.begin(), Hs.end());
+  const double keep = sp.keep[stageIndex];
+  const double theta = Hs[static_cast<size_t>((1.0 - keep) * np)];
+  double s = 0.97 * T / std::max(1e-6, sumMax - theta);
+  Stage st;
+  for (int attempt = 0; attempt < 40; ++attempt, s *= 0.95) {
+    st.pos = chosen;
+    st.table.assign(static_cast<size_t>(n) * 511, 0);
+    for (int f = 0; f < n; ++f)
+      for (int k = 0; k < 511; ++k) {
+        double v = std::round(s * (hmax[f] - hs[f][k]));
+        st.table[f * 511 + k] = static_cast<int32_t>(std::min<double>(v, sp.cap));
+      }
+    std::vector<int> S(np);
+    for (size_t i = 0; i < np; ++i) S[i] = stage_sum_row(st, pos.row(i));
+    std::sort(S.begin(), S.end());
+    const int V = S[std::min(np - 1, static_cast<size_t>(std::ceil(keep * np)) - 1)];
+    int shift = T - V;
+    if (shift < 0) continue;
+    for (int f = 0; f < n && shift > 0; ++f) {
+      int mx = *std::max_element(st.table.begin() + f * 511, st.table.begin() + (f + 1) * 511);
+      int add = std::min(shift, sp.cap - mx);
+      for (int k = 0; k < 511; ++k) st.table[f * 511 + k] += add;
+      shift -= add;
+    }
+    if (shift > 0) continue;
+    st.threshold = T;
+    return st;
+  }
+  std::fprintf(stderr, "quantisation failed for %s stage %d\n", sp.name, stageIndex);
+  st.threshold = T;
+  return st;
+}
+
+// Reservoir of negatives mined from windows that pass the cascade so far.
+struct Reservoir {
+  size_t cap;
+  Samples s;
+  size_t seen = 0;
+  void offer(const Spec& sp, const uint16_t* mct, int lw, int x, int y) {
+    ++seen;
+    if (s.size() < cap) {
+      add_window(s, sp, mct, lw, x, y);
+      return;
+    }
+    size_t j = std::uniform_int_distribution<size_t>(0, seen - 1)(rng);
+    if (j < cap) {
+      uint16_t* row = s.codes.data() + j * s.P;
+      for (size_t p = 0; p < sp.px.size(); ++p) row[p] = mct[(y + sp.py[p]) * lw + x + sp.px[p]];
+    }
+  }
+};
+
+struct Level {
+  int w, h;
+  std::vector<uint16_t> mct;
+  int tx = -1, ty = -1;  // window that centres on the target (eyes, mouth), -1 for scenes
+  double fx = 0, fy = 0, fw = 0, fh = 0;  // face box in level coordinates (face levels of landmark photos)
+};
+
+// Overlap of a face window with the level's face: intersection over union.
+double face_iou(const Level& L, int x, int y) {
+  if (L.fw <= 0) return 0;
+  double ix = std::max(0.0, std::min(x + 22.0, L.fx + L.fw) - std::max<double>(x, L.fx));
+  double iy = std::max(0.0, std::min(y + 24.0, L.fy + L.fh) - std::max<double>(y, L.fy));
+  double in = ix * iy;
+  return in / (22.0 * 24.0 + L.fw * L.fh - in);
+}
+
+void add_face_levels(const cv::Mat& g, std::vector<Level>& levels, const cv::Rect2d* face) {
+  int ww, wh;
+  caIF_WorkingSize(g.cols, g.rows, &ww, &wh);
+  std::vector<uint8_t> work(ww * wh);
+  Resize_NN(g.data, g.cols, g.rows, work.data(), ww, wh);
+  int longer = std::max(ww, wh), r = (std::min(ww, wh) << 15) / longer;
+  for (int s : {40, 49, 60, 74, 90, 110, 134, 164, 200, 245, 300, 367, 449, 550}) {
+    if (s > longer) break;
+    int other = std::max(4, ww == wh ? s : (s * r) >> 15);
+    int lw = ww >= wh ? s : other, lh = ww >= wh ? other : s;
+    std::vector<uint8_t> lv(lw * lh);
+    Resize_NN(work.data(), ww, wh, lv.data(), lw, lh);
+    Level L{lw, lh, std::vector<uint16_t>(lw * lh, 0)};
+    image2MCT_FD(lv.data(), lw, lh, L.mct.data());
+    if (face) {
+      double k = double(lw) / g.cols;
+      L.fx = face->x * k, L.fy = face->y * k, L.fw = face->width * k, L.fh = face->height * k;
+      if (L.fw < 8) continue;  // the face is smaller than any window here: nothing to learn
+    }
+    levels.push_back(std::move(L));
+  }
+}
+
+using LevelScan = std::function<bool(const Level&, int x, int y)>;  // true: window may be a negative
+
+std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const std::vector<Level>& levels,
+                                 int ystep, const LevelScan& negOk, size_t negCount, FILE* report) {
+  std::vector<Stage> cascade;
+  for (size_t k = 0; k < sp.features.size(); ++k) {
+    double t0 = now();
+    Samples pos;
+    pos.P = allPos.P;
+    for (size_t i = 0; i < allPos.size(); ++i)
+      if (cascade_row(cascade, allPos.row(i))) pos.codes.insert(pos.codes.end(), allPos.row(i), allPos.row(i) + allPos.P);
+    Reservoir res{negCount, {}, 0};
+    res.s.P = allPos.P;
+    size_t windows = 0;
+    for (const Level& L : levels)
+      for (int y = 0; y < L.h - sp.wh; y += ystep)
+        for (int x = 0; x < L.w - sp.ww; ++x) {
+          if (!negOk(L, x, y)) continue;
+          ++windows;
+          if (cascade_window(cascade, sp, L.mct.data(), L.w, x, y)) res.offer(sp, L.mct.data(), L.w, x, y);
+        }
+    std::fprintf(report, "%s stage %zu: %zu positives, %zu of %zu negative windows pass the earlier stages (%.2e)\n",
+                 sp.name, k, pos.size(), res.seen, windows, windows ? double(res.seen) / windows : 0.0);
+    if (res.s.size() < 100) {
+      std::fprintf(report, "  too few negatives left; stage trained on what there is\n");
+      if (res.s.size() == 0) res.s = pos;  // degenerate, never expected
+    }
+    cascade.push_back(train_stage(sp, k, pos, res.s));
+    size_t kept = 0;
+    for (size_t i = 0; i < allPos.size(); ++i) kept += cascade_row(cascade, allPos.row(i));
+    size_t negPass = 0;
+    for (size_t i = 0; i < res.s.size(); ++i) negPass += cascade_row(cascade, res.s.row(i));
+    std::fprintf(report, "  trained in %.1f s: keeps %.4f of all positives, passes %.4f of its negatives\n",
+                 now() - t0, double(kept) / allPos.size(), double(negPass) / res.s.size());
+    std::fflush(report);
+  }
+  size_t windows = 0, pass = 0;
+  for (const Level& L : levels)
+    for (int y = 0; y < L.h - sp.wh; y += ystep)
+      for (int x = 0; x < L.w - sp.ww; ++x) {
+        if (!negOk(L, x, y)) continue;
+        ++windows;
+        pass += cascade_window(cascade, sp, L.mct.data(), L.w, x, y);
+      }
+  std::fprintf(report, "%s cascade: %zu of %zu negative windows pass (%.2e)\n", sp.name, pass, windows,
+               windows ? double(pass) / windows : 0.0);
+  return cascade;
+}
+
+// NN sampling of an aligned window through a similarity transform.
+void sample_window(const cv::Mat& g, double mx, double my, double angle, double s, double cx, double cy, int ww, int wh,
+                   std::vector<uint8_t>& out) {
+  out.resize(ww * wh);
+  const double c = std::cos(angle) * s, sn = std::sin(angle) * s;
+  for (int v = 0; v < wh; ++v)
+    for (int u = 0; u < ww; ++u) {
+      double du = u - cx, dv = v - cy;
+      int sx = static_cast<int>(std::floor(mx + c * du - sn * dv + 0.5));
+      int sy = static_cast<int>(std::floor(my + sn * du + c * dv + 0.5));
+      sx = std::clamp(sx, 0, g.cols - 1);
+      sy = std::clamp(sy, 0, g.rows - 1);
+      out[v * ww + u] = g.at<uint8_t>(sy, sx);
+    }
+}
+
+cv::Mat flip(const cv::Mat& g) {
+  cv::Mat f = g.clone();
+  for (int y = 0; y < g.rows; ++y)
+    for (int x = 0; x < g.cols; ++x) f.at<uint8_t>(y, x) = g.at<uint8_t>(y, g.cols - 1 - x);
+  return f;
+}
+
+// The face with its eyes and mouth, optionally mirrored (eyes swapped).
+struct Pts {
+  double lx, ly, rx, ry, mx, my;
+};
+Pts points(const LandmarkFace& f, bool mirror, int width) {
+  Pts p{f.x[0], f.y[0], f.x[1], f.y[1], (f.x[3] + f.x[4]) / 2, (f.y[3] + f.y[4]) / 2};
+  if (mirror) {
+    double w1 = width - 1;
+    p = Pts{w1 - f.x[1], f.y[1], w1 - f.x[0], f.y[0], w1 - p.mx, p.my};
+  }
+  return p;
+}
+
+template <typename T>
+void write_table(std::ofstream& o, const char* type, const char* name, const std::vector<T>& v, int perLine) {
+  o << "const " << type << " " << name << "[" << v.size() << "] = {";
+  for (size_t i = 0; i < v.size(); ++i) {
+    if (i % perLine == 0) o << "\n   ";
+    o << " " << static_cast<long long>(v[i]) << ",";
+  }
+  o << "\n};\n\n";
+}
+
+void write_model(const std::string& path, const Spec& sp, const std::vector<Stage>& c, const char* type16,
+                 const char* nx, const char* ny, const char* alphaType, const char* na, const std::string& note) {
+  std::vector<long long> X, Y, A;
+  for (const Stage& st : c)
+    for (size_t f = 0; f < st.pos.size(); ++f) {
+      X.push_back(sp.px[st.pos[f]]);
+      Y.push_back(sp.py[st.pos[f]]);
+      for (int k = 0; k < 511; ++k) A.push_back(st.table[f * 511 + k]);
+    }
+  std::ofstream o(path);
+  o << "// Generated by tools/face_training/face_train (" << note << "); do not edit.\n"
+    << "// " << sp.name << " cascade: window " << sp.ww << " x " << sp.wh << ", stages";
+  for (size_t k = 0; k < c.size(); ++k) o << " " << sp.features[k] << " (<= " << c[k].threshold << ")";
+  o << ".\n#include \"face_models.h\"\n\n// clang-format off\n";
+  write_table(o, type16, nx, X, 24);
+  write_table(o, type16, ny, Y, 24);
+  write_table(o, alphaType, na, A, 24);
+  o << "// clang-format on\n";
+}
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (argc < 3) {
+    std::fprintf(stderr, "usage: face_train DATA_DIR OUT_DIR [face|eye|mouth ...]\n");
+    return 2;
+  }
+  const std::string data = argv[1], out = argv[2];
+  bool doFace = argc == 3, doEye = argc == 3, doMouth = argc == 3;
+  for (int i = 3; i < argc; ++i) {
+    doFace |= !std::strcmp(argv[i], "face");
+    doEye |= !std::strcmp(argv[i], "eye");
+    doMouth |= !std::strcmp(argv[i], "mouth");
+  }
+  FILE* report = stdout;
+  double t0 = now();
+  std::vector<LandmarkFace> faces = load_landmarks(data, "new_training.txt");
+  std::fprintf(report, "%zu training faces with checked landmarks\n", faces.size());
+  std::vector<cv::Mat> greys;
+  for (const auto& f : faces) greys.push_back(load_grey(f.path));
+
+  if (doFace) {
+    Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255, {0.995, 0.995, 0.99, 0.98}};
+    for (int y = 1; y <= 22; ++y)
+      for (int x = 1; x <= 20; ++x) sp.px.push_back(x), sp.py.push_back(y);
+    Samples pos;
+    pos.P = sp.px.size();
+    std::vector<uint8_t> win;
+    std::vector<uint16_t> mct(22 * 24);
+    for (size_t i = 0; i < faces.size(); ++i) {
+      if (greys[i].empty()) continue;
+      cv::Mat fl = flip(greys[i]);
+      for (int m = 0; m < 2; ++m) {
+        const cv::Mat& g = m ? fl : greys[i];
+        Pts p = points(faces[i], m, g.cols);
+        double d = std::hypot(p.rx - p.lx, p.ry - p.ly);
+        if (d < 6) continue;
+        double a = std::atan2(p.ry - p.ly, p.rx - p.lx);
+        for (int j = 0; j < 2; ++j) {
+          double scale = uni(0.91, 1.1), roll = uni(-0.17, 0.17);
+          double s = d / kEyeDist * scale;
+          sample_window(g, (p.lx + p.rx) / 2, (p.ly + p.ry) / 2, a + roll, s, kEyeMidX + uni(-1, 1),
+                        kEyeMidY + uni(-1, 1), 22, 24, win);
+          std::fill(mct.begin(), mct.end(), 0);
+          image2MCT_FD(win.data(), 22, 24, mct.data());
+          add_window(pos, sp, mct.data(), 22, 0, 0);
+        }
+      }
+    }
+    // Scenes without faces (every fifth one held out for evaluation), at the
+    // working size of the analyser and every pyramid level.
+    std::vector<std::string> scenes = list_images(data + "/images_notfaces");
+    std::vector<Level> levels;
+    for (size_t i = 0; i < scenes.size(); ++i) {
+      if (i % 5 == 0) continue;
+      cv::Mat g = load_grey(scenes[i]);
+      if (g.empty()) continue;
+      add_face_levels(g, levels, nullptr);
+      add_face_levels(flip(g), levels, nullptr);
+    }
+    // The surroundings of faces in landmark photos: windows off the face.
+    for (size_t i = 0; i < faces.size(); i += 12) {
+      if (greys[i].empty()) continue;
+      Pts p = points(faces[i], false, greys[i].cols);
+      cv::Rect2d fb = face_box_from_eyes(p.lx, p.ly, p.rx, p.ry);
+      add_face_levels(greys[i], levels, &fb);
+    }
+    std::fprintf(report, "face: %zu positive windows, %zu scene levels (%.0f s)\n", pos.size(), levels.size(),
+                 now() - t0);
+    auto cascade = train_cascade(sp, pos, levels, 1, [](const Level& L, int x, int y) { return face_iou(L, x, y) < 0.25; },
+                                 30000, report);
+    write_model(out + "/frontal_model.cpp", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
+                "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
+  }
+
+  // Eye and mouth: regions of jittered face boxes, at the detectors' levels.
+  for (int part = 0; part < 2; ++part) {
+    if (part == 0 && !doEye) continue;
+    if (part == 1 && !doMouth) continue;
+    const bool eye = part == 0;
+    Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX, {0.99, 0.99, 0.98}}
+                  : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX, {0.99, 0.99, 0.98}};
+    for (int y = 1; y <= sp.wh - 2; ++y)
+      for (int x = 1; x <= sp.ww - 2; ++x) sp.px.push_back(x), sp.py.push_back(y);
+    Samples pos;
+    pos.P = sp.px.size();
+    std::vector<Level> levels;
+    int missed = 0;
+    for (size_t i = 0; i < faces.size(); ++i) {
+      if (greys[i].empty()) continue;
+      cv::Mat fl = flip(greys[i]);
+      for (int m = 0; m < 2; ++m) {
+        const cv::Mat& g0 = m ? fl : greys[i];
+        Pts p = points(faces[i], m, g0.cols);
+        // The analyser's working image, and the face box its detector finds
+        // there (the detected boxes run smaller than the landmark box and
+        // sit higher: where the detector misses, that bias is imitated).
+        int gw, gh;
+        caIF_WorkingSize(g0.cols, g0.rows, &gw, &gh);
+        std::vector<uint8_t> g(gw * gh);
+        Resize_NN(g0.data, g0.cols, g0.rows, g.data(), gw, gh);
+        const double f = double(gw) / g0.cols;
+        auto sc = [f](double v) { return v * f + (f - 1) / 2.0; };
+        cv::Rect2d fb = face_box_from_eyes(sc(p.lx), sc(p.ly), sc(p.rx), sc(p.ry));
+        SMyRect2 box{};
+        int found = fd_find(g.data(), gw, gh, 0, 0, 3);
+        SMyRect2 boxes[kFdListSize];
+        double bestIou = 0.3;
+        if (found > 0 && fd_where(boxes))
+          for (int k = 0; k < found; ++k) {
+            cv::Rect2d d(boxes[k].left, boxes[k].top, boxes[k].right - boxes[k].left, boxes[k].bottom - boxes[k].top);
+            double in = (d & fb).area(), u = in / (d.area() + fb.area() - in);
+            if (u >= bestIou) bestIou = u, box = boxes[k];
+          }
+        if (bestIou == 0.3) {
+          ++missed;
+          double js = uni(0.8, 0.92), jx = uni(-0.11, -0.02) * fb.width, jy = uni(-0.12, -0.04) * fb.width;
+          double cx = fb.x + fb.width / 2 + jx, cy = fb.y + fb.height / 2 + jy;
+          double bw = fb.width * js, bh = fb.height * js;
+          box = SMyRect2{static_cast<int>(cx - bw / 2), static_cast<int>(cy - bh / 2), 0, 0};
+          box.right = box.left + static_cast<int>(bw);
+          box.bottom = box.top + static_cast<int>(bh);
+        }
+        for (int side = 0; side < (eye ? 2 : 1); ++side) {
+          SMyRect2 r;
+          double tx, ty;
+          if (eye) {
+            SMyRect2 L, R;
+            ed_regions(box, &L, &R);
+            r = side ? R : L;
+            tx = side ? r.right - sc(p.rx) : sc(p.lx) - r.left;
+            ty = (side ? sc(p.ry) : sc(p.ly)) - r.top;
+          } else {
+            r = md_region(box, gh);
+            tx = sc(p.mx) - r.left;
+            ty = sc(p.my) - r.top;
+          }
+          int rw = r.right - r.left, rh = r.bottom - r.top;
+          if (rw < 4 || rh < 4) continue;
+          std::vector<uint8_t> region(rw * rh);
+          edmd_copy_region(g.data(), gw, gh, r, region.data());
+          if (eye && side) FlipX(region.data(), rw, rh);
+          int widths[4], heights[4];
+          int n = edmd_levels(rw, rh, eye ? 22 : 13, widths, heights);
+          for (int k = 0; k < n; ++k) {
+            int lw = widths[k], lh = heights[k];
+            std::vector<uint8_t> lv(lw * lh);
+            Resize_BI(region.data(), rw, rh, lv.data(), lw, lh);
+            Level L{lw, lh, std::vector<uint16_t>(lw * lh, 0)};
+            image2MCT9_1(lv.data(), lw, lh, L.mct.data());
+            double k2 = double(lw) / rw;
+            L.tx = static_cast<int>(std::lround(tx * k2 - sp.ww / 2.0));
+            L.ty = static_cast<int>(std::lround(ty * k2 - sp.wh / 2.0));
+            for (int dy = -1; dy <= 1; ++dy)
+              for (int dx = -1; dx <= 1; ++dx) {
+                if (dx && dy) continue;
+                int x = L.tx + dx, y = L.ty + dy;
+                if (x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh) add_window(pos, sp, L.mct.data(), lw, x, y);
+              }
+            if (i % 2 == 0) levels.push_back(std::move(L));  // half the faces serve as negative sources
+          }
+        }
+      }
+    }
+    std::fprintf(report, "%s: %zu positive windows, %zu region levels, detector missed %d faces (%.0f s)\n", sp.name,
+                 pos.size(), levels.size(), missed, now() - t0);
+    const int tol = 3;
+    auto cascade = train_cascade(
+        sp, pos, levels, 1,
+        [tol](const Level& L, int x, int y) { return std::abs(x - L.tx) > tol || std::abs(y - L.ty) > tol; }, 30000,
+        report);
+    if (eye)
+      write_model(out + "/eye_model.cpp", sp, cascade, "uint16_t", "m_nEyeMCTFeatureX", "m_nEyeMCTFeatureY", "int32_t",
+                  "m_nEDMCTAlpha", "eye windows from MTFL training faces, negatives from the rest of the eye regions");
+    else
+      write_model(out + "/mouth_model.cpp", sp, cascade, "uint16_t", "m_nMouthMCTFeatureX", "m_nMouthMCTFeatureY",
+                  "int32_t", "m_nMDMCTAlpha",
+                  "mouth windows from MTFL training faces, negatives from the rest of the mouth regions");
+  }
+  std::fprintf(report, "done in %.0f s\n", now() - t0);
+  return 0;
+}
