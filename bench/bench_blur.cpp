@@ -3,6 +3,8 @@
 // OpenCV is installed. Run with GLIMMER_SCALAR=1 for the single-threaded path.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <random>
 #include <vector>
 
@@ -14,39 +16,22 @@
 #endif
 
 namespace {
-struct Picture {
-  int width, height;
-  std::vector<int> in, out;
-  std::vector<unsigned char> mask;
-};
+using Picture = BenchPicture;
 
+// The left half of the picture is selected.
 Picture& picture(int megapixels) {
-  static Picture one, twelve;
-  Picture& p = megapixels == 1 ? one : twelve;
-  if (p.in.empty()) {
-    p.width = megapixels == 1 ? 1024 : 4000;
-    p.height = megapixels == 1 ? 1024 : 3000;
-    const size_t n = static_cast<size_t>(p.width) * p.height;
-    p.in.resize(n);
-    p.out.resize(n);
-    p.mask.assign(n, 0);
+  Picture& p = bench_picture(megapixels);
+  const size_t n = p.mask.size();
+  if (p.mask[0] == 0) {
     for (size_t i = 0; i < n; ++i) p.mask[i] = (i % p.width) < static_cast<size_t>(p.width / 2);
-    std::mt19937 rng(1);
-    for (int& v : p.in) v = static_cast<int>(rng());
   }
   return p;
 }
 
 template <class Op>
 void run(benchmark::State& state, Op op) {
-  Picture& p = picture(static_cast<int>(state.range(0)));
-  for (auto _ : state) {
-    op(p);
-    benchmark::DoNotOptimize(p.out.data());
-    benchmark::ClobberMemory();
-  }
-  state.counters["MPix/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * p.in.size() / 1e6,
-                                                benchmark::Counter::kIsRate);
+  picture(static_cast<int>(state.range(0)));
+  bench_run(state, op);
 }
 
 void ApplyBlur(benchmark::State& s) {

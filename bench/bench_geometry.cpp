@@ -4,6 +4,8 @@
 // shorter side. Run with GLIMMER_SCALAR=1 for the single-threaded path.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstring>
 #include <random>
 #include <vector>
@@ -15,36 +17,14 @@
 #endif
 
 namespace {
-struct Picture {
-  int width, height;
-  std::vector<int> in, out;
-};
+using Picture = BenchPicture;
 
-Picture& picture(int megapixels) {
-  static Picture one, twelve;
-  Picture& p = megapixels == 1 ? one : twelve;
-  if (p.in.empty()) {
-    p.width = megapixels == 1 ? 1024 : 4000;
-    p.height = megapixels == 1 ? 1024 : 3000;
-    const size_t n = static_cast<size_t>(p.width) * p.height;
-    p.in.resize(n);
-    p.out.resize(n);
-    std::mt19937 rng(1);
-    for (int& v : p.in) v = static_cast<int>(rng());
-  }
-  return p;
-}
+Picture& picture(int megapixels) { return bench_picture(megapixels); }
 
 template <class Op>
 void run(benchmark::State& state, Op op) {
-  Picture& p = picture(static_cast<int>(state.range(0)));
-  for (auto _ : state) {
-    op(p);
-    benchmark::DoNotOptimize(p.out.data());
-    benchmark::ClobberMemory();
-  }
-  state.counters["MPix/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * p.in.size() / 1e6,
-                                                benchmark::Counter::kIsRate);
+  picture(static_cast<int>(state.range(0)));
+  bench_run(state, op);
 }
 
 #define GEOMETRY_BENCH(name, ...)                                       \

@@ -3,6 +3,8 @@
 // Run with GLIMMER_SCALAR=1 to measure the plain single-threaded path.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstring>
 #include <random>
 #include <vector>
@@ -15,42 +17,22 @@
 #endif
 
 namespace {
-struct Picture {
-  int width, height;
-  std::vector<int> in, out;
-  std::vector<unsigned char> mask;
-};
+using Picture = BenchPicture;
 
+// Every pixel is selected.
 Picture& picture(int megapixels) {
-  static Picture one, twelve;
-  Picture& p = megapixels == 1 ? one : twelve;
-  if (p.in.empty()) {
-    p.width = megapixels == 1 ? 1024 : 4000;
-    p.height = megapixels == 1 ? 1024 : 3000;
-    const size_t n = static_cast<size_t>(p.width) * p.height;
-    p.in.resize(n);
-    p.out.resize(n);
-    p.mask.assign(n, 1);
-    std::mt19937 rng(1);
-    for (int& v : p.in) v = static_cast<int>(rng());
-  }
+  Picture& p = bench_picture(megapixels);
+  if (p.mask[0] == 0) p.mask.assign(p.mask.size(), 1);
   return p;
 }
 
-constexpr px_rect kWhole{0, -1, 0, -1};
-
 template <class Op>
 void run(benchmark::State& state, Op op) {
-  Picture& p = picture(static_cast<int>(state.range(0)));
-  for (auto _ : state) {
-    op(p);
-    benchmark::DoNotOptimize(p.out.data());
-    benchmark::ClobberMemory();
-  }
-  state.SetBytesProcessed(static_cast<int64_t>(state.iterations()) * p.in.size() * 4);
-  state.counters["MPix/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * p.in.size() / 1e6,
-                                                benchmark::Counter::kIsRate);
+  picture(static_cast<int>(state.range(0)));
+  bench_run(state, op);
 }
+
+constexpr px_rect kWhole{0, -1, 0, -1};
 
 #define REGION_BENCH(name, fn, level)                                                                   \
   void name(benchmark::State& s) {                                                                      \

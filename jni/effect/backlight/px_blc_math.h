@@ -6,31 +6,16 @@
 #include <array>
 #include <cstdint>
 
-namespace blc {
+#include "../px_math.h"
 
-// floor(sqrt(x)) for 64-bit x.
-constexpr uint64_t isqrt64(uint64_t x) {
-  uint64_t r = 0;
-  uint64_t bit = uint64_t{1} << 62;
-  while (bit > x) bit >>= 2;
-  while (bit) {
-    if (x >= r + bit) {
-      x -= r + bit;
-      r = (r >> 1) + bit;
-    } else {
-      r >>= 1;
-    }
-    bit >>= 2;
-  }
-  return r;
-}
+namespace blc {
 
 // kRootQ30[k] = 2^(2^-k) in Q30, k = 0..16, each the integer square root of
 // the one before.
 constexpr std::array<uint64_t, 17> make_roots() {
   std::array<uint64_t, 17> t{};
   t[0] = uint64_t{2} << 30;
-  for (int k = 1; k < 17; ++k) t[k] = isqrt64(t[k - 1] << 30);
+  for (int k = 1; k < 17; ++k) t[k] = px_isqrt_floor(t[k - 1] << 30);
   return t;
 }
 inline constexpr std::array<uint64_t, 17> kRootQ30 = make_roots();

@@ -1,5 +1,6 @@
 // Selective blur, tilt-shift, miniature and out-focus blur on a reduced copy
 // of the picture.
+#include "../px_math.h"
 #include "px_blur.h"
 
 #include <cstdint>
@@ -43,7 +44,6 @@ bool is_empty(int left, int right, int top, int bottom) { return left > right ||
 
 size_t area(int w, int h) { return static_cast<size_t>(w) * static_cast<size_t>(h); }
 
-int clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
 
 // Sampling position of one output row or column on the reduced picture:
 // 17.15 accumulator, index masked to 11 bits, 5-bit fraction, an index at or
@@ -93,7 +93,7 @@ void blur_line(const unsigned char* src, unsigned char* dst, const unsigned char
       }
     }
     unsigned char* d = dst + static_cast<size_t>(pos) * along_px * 3;
-    for (int ch = 0; ch < 3; ++ch) d[ch] = static_cast<unsigned char>(clamp255(((sum[ch] << 10) / weight) >> 10));
+    for (int ch = 0; ch < 3; ++ch) d[ch] = static_cast<unsigned char>(px_clamp255(((sum[ch] << 10) / weight) >> 10));
   }
 }
 
@@ -291,7 +291,7 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
           int b = (top * (32 - sy.f) + bottom * sy.f) >> 10;
           if (b > 255) b = 255;
           const int own = static_cast<int>((s >> (16 - 8 * c)) & 255);
-          out |= static_cast<uint32_t>(clamp255((b * (256 - a) + own * a) >> 8)) << (16 - 8 * c);
+          out |= static_cast<uint32_t>(px_clamp255((b * (256 - a) + own * a) >> 8)) << (16 - 8 * c);
         }
         dst[i] = static_cast<int>(out);
       }

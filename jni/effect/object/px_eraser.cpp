@@ -1,3 +1,4 @@
+#include "../px_math.h"
 #include "px_eraser.h"
 
 #include <chrono>
@@ -29,20 +30,6 @@ enum : unsigned char { kKnown = 0, kUnknown = 1, kFront = 2 };
 constexpr unsigned char kTargetLabel = 10;
 
 // ---- the fill-front normal table ------------------------------------------------
-constexpr int64_t isqrt64(int64_t v) {
-  int64_t r = 0, bit = int64_t{1} << 62;
-  while (bit > v) bit >>= 2;
-  while (bit) {
-    if (v >= r + bit) {
-      v -= r + bit;
-      r = (r >> 1) + bit;
-    } else {
-      r >>= 1;
-    }
-    bit >>= 2;
-  }
-  return r;
-}
 constexpr int32_t rounded_ratio(int64_t num, int64_t den) {
   return static_cast<int32_t>(num >= 0 ? (num + den / 2) / den : -((-num + den / 2) / den));
 }
@@ -62,7 +49,7 @@ constexpr NormTable make_norm_lut() {
         t.v[i + 1] = 52429;
         continue;
       }
-      const int64_t len = isqrt64(static_cast<int64_t>(dx * dx + dy * dy) << 56);  // |t| in 36.28
+      const int64_t len = static_cast<int64_t>(px_isqrt_floor(static_cast<uint64_t>(dx * dx + dy * dy) << 56));  // |t| in 36.28
       t.v[i] = rounded_ratio(static_cast<int64_t>(-dy) * (int64_t{1} << 44), len);
       t.v[i + 1] = rounded_ratio(static_cast<int64_t>(dx) * (int64_t{1} << 44), len);
     }

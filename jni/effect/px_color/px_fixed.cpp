@@ -2,6 +2,7 @@
 
 #include <climits>
 
+#include "../px_math.h"
 #include "px_fixed_tables.h"
 
 int fix_errno = 0;
@@ -140,19 +141,10 @@ int iidiv(int a, int b) {
 
 int isqrt_(int x) {
   if (x <= 0) return 0;
-  // Digit-by-digit root over 16 result bits, then rounded to nearest.
-  uint32_t op = static_cast<uint32_t>(x);
-  uint32_t root = 0;
-  for (uint32_t one = 1u << 30; one != 0; one >>= 2) {
-    if (op >= root + one) {
-      op -= root + one;
-      root = (root >> 1) + one;
-    } else {
-      root >>= 1;
-    }
-  }
-  if (op > root) ++root;
-  return static_cast<int>(root);
+  // The floor root, then rounded to nearest: + 1 when the remainder exceeds it.
+  const uint32_t root = static_cast<uint32_t>(px_isqrt_floor(static_cast<uint64_t>(x)));
+  const uint32_t rem = static_cast<uint32_t>(x) - root * root;
+  return static_cast<int>(rem > root ? root + 1 : root);
 }
 
 void px_rgb2hsv(int r, int g, int b, int* h, int* s, int* v) {

@@ -15,6 +15,7 @@
 #include <cstring>
 
 #include "../kalo/px_parallel.h"
+#include "../px_math.h"
 #include "../px_types.h"
 
 template <class PixelFn>
@@ -52,7 +53,6 @@ void px_region_map(const int* in, const unsigned char* mask, int* out, int width
 }
 
 // Channel helpers for the pixel functions.
-inline int px_clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
 inline uint32_t px_argb(uint32_t alpha_source, int r, int g, int b) {
   return (alpha_source & 0xFF000000u) | static_cast<uint32_t>(r) << 16 | static_cast<uint32_t>(g) << 8 |
          static_cast<uint32_t>(b);

@@ -1,4 +1,5 @@
 // Reflection, kaleidoscope and the circular mask of the effect library.
+#include "../../px_math.h"
 #include <cstdint>
 #include <cstring>
 
@@ -9,23 +10,6 @@
 
 namespace {
 bool argb_only(int format) { return format == IEL_FORMAT_ARGB_PACK; }
-int clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
-
-// Largest s with s * s <= v.
-uint32_t isqrt32(uint32_t v) {
-  uint32_t r = 0, bit = 1u << 30;
-  while (bit > v) bit >>= 2;
-  while (bit) {
-    if (v >= r + bit) {
-      v -= r + bit;
-      r = (r >> 1) + bit;
-    } else {
-      r >>= 1;
-    }
-    bit >>= 2;
-  }
-  return r;
-}
 
 // The faded mirror rows of a 0xAARRGGBB picture.
 void reflect_argb(const uint32_t* src, uint32_t* dst, int w, int h, int rh) {
@@ -39,8 +23,8 @@ void reflect_argb(const uint32_t* src, uint32_t* dst, int w, int h, int rh) {
       const int r = (s[x] >> 16) & 255, g = (s[x] >> 8) & 255, b = s[x] & 255;
       const int y = IEL_Luma(r, g, b);
       const int delta = (y * f >> 10) - y;
-      d[x] = 0xFF000000u | static_cast<uint32_t>(clamp255(r + delta)) << 16 |
-             static_cast<uint32_t>(clamp255(g + delta)) << 8 | static_cast<uint32_t>(clamp255(b + delta));
+      d[x] = 0xFF000000u | static_cast<uint32_t>(px_clamp255(r + delta)) << 16 |
+             static_cast<uint32_t>(px_clamp255(g + delta)) << 8 | static_cast<uint32_t>(px_clamp255(b + delta));
     }
   }
 }
@@ -151,7 +135,7 @@ int IEL_CreateCircularMask(structIELImage* image, int cx, int cy, int radius, st
     for (int x = 0; x < w; ++x) {
       const int64_t dx = x - cx, dy = y - cy;
       const int64_t d2 = dx * dx + dy * dy;
-      const bool in = radius >= 0 && d2 <= 0xFFFFFFFFll && isqrt32(static_cast<uint32_t>(d2)) <= static_cast<uint32_t>(radius);
+      const bool in = radius >= 0 && d2 <= 0xFFFFFFFFll && px_isqrt_floor(static_cast<uint64_t>(d2)) <= static_cast<uint64_t>(radius);
       const structIELPixel& p = in ? inside : outside;
       unsigned char* o = image->buffer + (static_cast<size_t>(y) * w + x) * bpp;
       if (bpp == 4) {

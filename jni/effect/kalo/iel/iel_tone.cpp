@@ -1,4 +1,5 @@
 // Sepia and variable brightness.
+#include "../../px_math.h"
 #include <cstdint>
 #include <cstring>
 
@@ -7,7 +8,6 @@
 #include "iel_luma.h"
 
 namespace {
-int clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
 }  // namespace
 
 int IEL_SepiaFast(structIELImage* input, structIELImage* output, int level) {
@@ -61,7 +61,7 @@ int IEL_VariableBrightness_ARGB8888(structIELImage* input, structIELImage* outpu
     return rc;
   }
   uint32_t table[256];
-  for (int i = 0; i < 256; ++i) table[i] = static_cast<uint32_t>(clamp255(i + level));
+  for (int i = 0; i < 256; ++i) table[i] = static_cast<uint32_t>(px_clamp255(i + level));
   const long long count = static_cast<long long>(input->width) * input->height;
   const auto* src = reinterpret_cast<const uint32_t*>(input->buffer);
   auto* dst = reinterpret_cast<uint32_t*>(output->buffer);

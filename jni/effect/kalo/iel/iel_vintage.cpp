@@ -1,4 +1,5 @@
 // Vintage: a warm, faded film look from three channel curves.
+#include "../../px_math.h"
 #include <cmath>
 #include <cstdint>
 
@@ -7,7 +8,6 @@
 #include "iel_internal.h"
 
 namespace {
-int clamp255(int v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
 int round_half(double v) { return static_cast<int>(v + 0.5); }
 // 255 * (v / 255)^e, rounded.
 int power(int v, double e) { return round_half(255.0 * std::pow(v / 255.0, e)); }
@@ -17,13 +17,13 @@ int power(int v, double e) { return round_half(255.0 * std::pow(v / 255.0, e)); 
 int chain(int x, int gain) {
   int y = x + 2 * IEL_StepTable[x];
   if (x < 128) {
-    y = y > 127 ? 126 : clamp255(1145 * ((y < 0 ? 0 : y) - 15) >> 10);
+    y = y > 127 ? 126 : px_clamp255(1145 * ((y < 0 ? 0 : y) - 15) >> 10);
   } else {
-    y = y > 254 ? 255 : clamp255(1145 * ((y < 128 ? 128 : y) - 15) >> 10);
+    y = y > 254 ? 255 : px_clamp255(1145 * ((y < 128 ? 128 : y) - 15) >> 10);
   }
   int v = power(y, 0.970873786407767);
   v = (955 * v >> 10) - 49;
-  v = clamp255(v * gain >> 10);
+  v = px_clamp255(v * gain >> 10);
   return power(v, 0.425531914893617);
 }
 }  // namespace
@@ -40,7 +40,7 @@ int chain(int x, int gain) {
 // look is a pure per-pixel curve, so it behaves the same on crops.
 void IEL_Vintage_Curves(uint8_t red[256], uint8_t green[256], uint8_t blue[256]) {
   for (int i = 0; i < 256; ++i) {
-    const int v = clamp255(power(i, 1.2987012987012987));
+    const int v = px_clamp255(power(i, 1.2987012987012987));
     const int lifted = (1150 * (v - 28)) >> 10;
     int a = power(lifted < 0 ? 0 : lifted, 0.9174311926605504) + 20;
     a = a > 255 ? 255 : a;
