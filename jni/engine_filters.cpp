@@ -7,6 +7,7 @@
 
 #include "bridge.h"
 #include "effect/px_filter/px_filter.h"
+#include "effect/px_gpu_effects/px_gpu_effects.h"
 
 namespace {
 
@@ -171,3 +172,69 @@ TEXTURE_FILTER(applyLightFlare, px_apply_lightflare_texture)
 TEXTURE_FILTER(applyOldPhotoTexture, px_apply_oldphoto_texture)
 
 // ---- shader-style effects --------------------------------------------------------
+
+FILTER_WHOLE(applyTurquoise, gpu_Turquoise)
+FILTER_WHOLE(applyRainbow, gpu_rainbow)
+FILTER_WHOLE(applyGothicNoir, gpu_gothicnoir)
+FILTER_WHOLE(applyVignette, gpu_vignette)
+FILTER_PARTIAL(applyTurquoisePartial, gpu_Turquoise_partial)
+FILTER_PARTIAL(applyRainbowPartial, gpu_rainbow_partial)
+FILTER_PARTIAL(applyGothicNoirPartial, gpu_gothicnoir_partial)
+FILTER_PARTIAL(applyVignettePartial, gpu_vignette_partial)
+
+#define GPU_TEXTURE(name, fn)                                                                                 \
+  ENGINE_METHOD(void, name)                                                                                   \
+  (JNIEnv * env, jobject, jintArray in, jintArray out, jintArray texture, jint w, jint h) {                   \
+    bridge::Call call(env, __func__);                                                                         \
+    run(call, in, nullptr, out, {texture}, w, h, nullptr, false,                                              \
+        [&](const Args& a) { fn(a.in, a.out, a.tex[0], a.width, a.height); });                                \
+  }                                                                                                           \
+  ENGINE_METHOD(void, name##Partial)                                                                          \
+  (JNIEnv * env, jobject, jintArray in, jbyteArray mask, jintArray out, jintArray texture, jint w, jint h,     \
+   jobject rect) {                                                                                            \
+    bridge::Call call(env, __func__);                                                                         \
+    run(call, in, mask, out, {texture}, w, h, rect, true, [&](const Args& a) {                                \
+      fn##_partial(a.in, a.mask, a.out, a.tex[0], a.width, a.height, a.rect.left, a.rect.right, a.rect.top,   \
+                   a.rect.bottom);                                                                            \
+    });                                                                                                       \
+  }
+
+GPU_TEXTURE(applyRugged, gpu_rugged)
+GPU_TEXTURE(applyOilPastel, gpu_oilPastel)
+GPU_TEXTURE(applyNoirNote, gpu_noirNote)
+
+ENGINE_METHOD(void, applyImpressionist)
+(JNIEnv* env, jobject, jintArray in, jintArray out, jintArray strokes, jintArray canvas, jint w, jint h) {
+  bridge::Call call(env, __func__);
+  run(call, in, nullptr, out, {strokes, canvas}, w, h, nullptr, false,
+      [&](const Args& a) { gpu_impressionist(a.in, a.out, a.tex[0], a.tex[1], a.width, a.height); });
+}
+
+ENGINE_METHOD(void, applyImpressionistPartial)
+(JNIEnv* env, jobject, jintArray in, jbyteArray mask, jintArray out, jintArray strokes, jintArray canvas, jint w,
+ jint h, jobject rect) {
+  bridge::Call call(env, __func__);
+  run(call, in, mask, out, {strokes, canvas}, w, h, rect, true, [&](const Args& a) {
+    gpu_impressionist_partial(a.in, a.mask, a.out, a.tex[0], a.tex[1], a.width, a.height, a.rect.left, a.rect.right,
+                              a.rect.top, a.rect.bottom);
+  });
+}
+
+ENGINE_METHOD(void, applyStucchevole)
+(JNIEnv* env, jobject, jintArray in, jintArray out, jintArray glow, jintArray paper, jintArray sparkle, jint w,
+ jint h) {
+  bridge::Call call(env, __func__);
+  run(call, in, nullptr, out, {glow, paper, sparkle}, w, h, nullptr, false, [&](const Args& a) {
+    gpu_stucchevole(a.in, a.out, a.tex[0], a.tex[1], a.tex[2], a.width, a.height);
+  });
+}
+
+ENGINE_METHOD(void, applyStucchevolePartial)
+(JNIEnv* env, jobject, jintArray in, jbyteArray mask, jintArray out, jintArray glow, jintArray paper,
+ jintArray sparkle, jint w, jint h, jobject rect) {
+  bridge::Call call(env, __func__);
+  run(call, in, mask, out, {glow, paper, sparkle}, w, h, rect, true, [&](const Args& a) {
+    gpu_stucchevole_partial(a.in, a.mask, a.out, a.tex[0], a.tex[1], a.tex[2], a.width, a.height, a.rect.left,
+                            a.rect.right, a.rect.top, a.rect.bottom);
+  });
+}

@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <cmath>
 #include <cstring>
 #include <random>
 #include <vector>
@@ -11,6 +12,7 @@
 #include "effect/px_color/px_hue.h"
 #include "effect/px_color/px_tone.h"
 #include "effect/px_filter/px_filter.h"
+#include "effect/px_gpu_effects/px_gpu_effects.h"
 #include "log_capture.h"
 
 namespace {
@@ -315,6 +317,92 @@ TEST(FilterLooks, DesignedLooksAreDeterministicAndDistinct) {
     for (const Pic& r : results) EXPECT_NE(a, r);
     results.push_back(a);
   }
+}
+
+// ---- shader-style effects ------------------------------------------------------------------
+
+TEST(GpuHelpers, AsStated) {
+  EXPECT_EQ(clamp(std::nanf(""), 0.0f, 1.0f), 0.0f);
+  EXPECT_EQ(clamp(2.0f, 0.0f, 1.0f), 1.0f);
+  EXPECT_EQ(clamp(-2.0f, 0.0f, 1.0f), 0.0f);
+  EXPECT_DOUBLE_EQ(smoothstep(0.0, 1.0, 0.5), 0.5);
+  EXPECT_DOUBLE_EQ(smoothstep(0.0, 1.0, 2.0), 1.0);
+  EXPECT_DOUBLE_EQ(smoothstep(1.0, 0.0, 0.25), 0.84375);  // reversed edges: t = 0.75
+  EXPECT_EQ(step(0.5, 0.49), 0.0);
+  EXPECT_EQ(step(0.5, 0.5), 1.0);
+  EXPECT_DOUBLE_EQ(length(3.0, 4.0), 5.0);
+  EXPECT_DOUBLE_EQ(flength(3.0f, 4.0f), 5.0);
+}
+
+TEST(GpuEffects, TurquoiseOfBlackAndWhite) {
+  int p[2] = {rgb(0, 0, 0, 0x12), rgb(255, 255, 255, 0)};
+  int o[2];
+  gpu_Turquoise(p, o, 2, 1);
+  EXPECT_EQ(o[0], rgb(19, 29, 51, 0x12));
+  EXPECT_EQ(o[1], rgb(198, 207, 230, 0));
+}
+
+TEST(GpuEffects, PartialWritesOnlySelectedPixels) {
+  const int w = 5, h = 4;
+  Pic in = random_picture(w, h, 50), whole(in.size());
+  gpu_Turquoise(in.data(), whole.data(), w, h);
+  std::vector<unsigned char> mask(in.size(), 1);
+  Pic out(in.size(), 3);
+  gpu_Turquoise_partial(in.data(), mask.data(), out.data(), w, h, 0, -1, 0, 0);  // empty rectangle
+  EXPECT_EQ(out, whole);
+
+  mask[w + 2] = 2;
+  std::fill(out.begin(), out.end(), 3);
+  gpu_vignette_partial(in.data(), mask.data(), out.data(), w, h, 2, 2, 1, 1);  // one pixel, byte 2
+  EXPECT_EQ(out, Pic(in.size(), 3));
+
+  Pic grain = random_picture(w, h, 51), rugged(in.size());
+  gpu_rugged(in.data(), rugged.data(), grain.data(), w, h);
+  gpu_rugged_partial(in.data(), mask.data(), out.data(), grain.data(), w, h, 1, 3, 0, 1);
+  for (int i = 0; i < w * h; ++i) {
+    const bool sel = i % w >= 1 && i % w <= 3 && i / w <= 1 && i != w + 2;
+    EXPECT_EQ(out[i], sel ? rugged[i] : 3) << i;
+  }
+}
+
+TEST(GpuEffects, VignetteDarkensCornersNotTheCentre) {
+  const int w = 21, h = 11;
+  Pic in(static_cast<size_t>(w) * h, rgb(200, 100, 50, 0x66)), out(in.size()), noir(in.size());
+  gpu_vignette(in.data(), out.data(), w, h);
+  EXPECT_EQ(out[5 * w + 10], in[5 * w + 10]);
+  EXPECT_EQ(out[0], rgb(60, 30, 15, 0x66));  // 0.3 in the corners
+  gpu_gothicnoir(in.data(), noir.data(), w, h);
+  EXPECT_LT(red(noir[0]), red(noir[5 * w + 10]));
+}
+
+TEST(GpuEffects, DesignedLooksAreDeterministicDistinctAndKeepAlpha) {
+  const int w = 40, h = 30;
+  Pic in = random_picture(w, h, 60, false);
+  Pic t1 = random_picture(w, h, 61), t2 = random_picture(w, h, 62), t3 = random_picture(w, h, 63);
+  auto runs = [&](Pic& o) {
+    std::vector<Pic> r;
+    gpu_rainbow(in.data(), o.data(), w, h), r.push_back(o);
+    gpu_gothicnoir(in.data(), o.data(), w, h), r.push_back(o);
+    gpu_vignette(in.data(), o.data(), w, h), r.push_back(o);
+    gpu_rugged(in.data(), o.data(), t1.data(), w, h), r.push_back(o);
+    gpu_oilPastel(in.data(), o.data(), t1.data(), w, h), r.push_back(o);
+    gpu_noirNote(in.data(), o.data(), t1.data(), w, h), r.push_back(o);
+    gpu_impressionist(in.data(), o.data(), t1.data(), t2.data(), w, h), r.push_back(o);
+    gpu_stucchevole(in.data(), o.data(), t1.data(), t2.data(), t3.data(), w, h), r.push_back(o);
+    return r;
+  };
+  Pic o(in.size());
+  const std::vector<Pic> a = runs(o), b = runs(o);
+  EXPECT_EQ(a, b);
+  for (size_t k = 0; k < a.size(); ++k) {
+    for (size_t i = 0; i < in.size(); ++i) ASSERT_EQ(alpha(a[k][i]), alpha(in[i])) << k;
+    for (size_t j = 0; j < k; ++j) EXPECT_NE(a[k], a[j]) << k << " " << j;
+  }
+  // The textures are taken in their documented order.
+  Pic x(in.size()), y(in.size());
+  gpu_impressionist(in.data(), x.data(), t1.data(), t2.data(), w, h);
+  gpu_impressionist(in.data(), y.data(), t2.data(), t1.data(), w, h);
+  EXPECT_NE(x, y);
 }
 
 }  // namespace

@@ -85,7 +85,30 @@ final class FilterOperations {
             // rectangle: hand it a copy.
             Engine.applySharpenPartial(in, mask == null ? null : mask.clone(), out, w, h, r);
         }));
-        // (shader-style effects)
+        // shader-style effects
+        ops.add(partial("turquoise", "Turquoise: compressed range over a blue-green floor",
+                Engine::applyTurquoisePartial));
+        ops.add(partial("rainbow", "Rainbow: a diagonal rainbow over the picture", Engine::applyRainbowPartial));
+        ops.add(partial("gothicnoir", "Gothic noir: hard cold black and white, reds kept as crimson",
+                Engine::applyGothicNoirPartial));
+        ops.add(partial("vignette", "Vignette: soft round darkening", Engine::applyVignettePartial));
+        ops.add(texture("rugged", "Rugged: gritty weathered sandstone", (w, h) -> Textures.grain(w, h, 71),
+                Engine::applyRuggedPartial));
+        ops.add(texture("oilpastel", "Oil pastel: waxy colour on paper", (w, h) -> Textures.grain(w, h, 81),
+                Engine::applyOilPastelPartial));
+        ops.add(texture("noirnote", "Noir note: soft warm black-and-white film", (w, h) -> Textures.grain(w, h, 91),
+                Engine::applyNoirNotePartial));
+        ops.add(new Operation("impressionist", "Impressionist: dabs of paint on canvas", true, List.of(), j -> {
+            System.arraycopy(j.in, 0, j.out, 0, j.in.length);
+            Engine.applyImpressionistPartial(j.in, j.mask, j.out, Textures.jitter(j.width, j.height, 101),
+                    Textures.paper(j.width, j.height, 102), j.width, j.height, j.rect);
+        }));
+        ops.add(new Operation("stucchevole", "Stucchevole: sugary candy-pastel postcard", true, List.of(), j -> {
+            System.arraycopy(j.in, 0, j.out, 0, j.in.length);
+            Engine.applyStucchevolePartial(j.in, j.mask, j.out, Textures.sunFlare(j.width, j.height, 111),
+                    Textures.paper(j.width, j.height, 112), Textures.starField(j.width, j.height, 113), j.width,
+                    j.height, j.rect);
+        }));
         return ops;
     }
 }

@@ -15,7 +15,9 @@ import java.util.Random;
  * along the line through the centre (for screen blends).</li>
  * <li>{@link #paper}: a paper surface of a given base colour with fine grain and short darker fibres.</li>
  * <li>{@link #grain}: neutral mid-grey (128) grain, which leaves a picture's tones in place under an
- * overlay blend and serves as film grain or a stroke field.</li>
+ * overlay blend and serves as film grain.</li>
+ * <li>{@link #jitter}: red, green and blue each uniform over 0..255, independently, in 2 x 2 cells: a field of
+ * random moves (mid-grey is no move) for the impressionist strokes.</li>
  * </ul>
  */
 public final class Textures {
@@ -205,5 +207,23 @@ public final class Textures {
     /** Neutral grain: paper of base grey 128. */
     public static int[] grain(int width, int height, long seed) {
         return paper(width, height, seed, 128, 128, 128);
+    }
+
+    /** Random moves: each 2 x 2 cell gets independent uniform red, green and blue values 0..255. */
+    public static int[] jitter(int width, int height, long seed) {
+        Random rnd = new Random(seed);
+        int cw = (width + 1) / 2;
+        int ch = (height + 1) / 2;
+        int[] cells = new int[cw * ch];
+        for (int i = 0; i < cells.length; i++) {
+            cells[i] = 0xFF000000 | rnd.nextInt(0x1000000);
+        }
+        int[] t = new int[width * height];
+        for (int y = 0; y < height; y++) {
+            for (int x = 0; x < width; x++) {
+                t[y * width + x] = cells[(y / 2) * cw + x / 2];
+            }
+        }
+        return t;
     }
 }

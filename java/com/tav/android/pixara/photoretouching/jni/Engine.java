@@ -486,7 +486,93 @@ public final class Engine {
      */
     public static native void applySharpenPartial(int[] in, byte[] mask, int[] out, int width, int height,
             Rect rect);
-    // (shader-style effects)
+    // Shader-style effects. Texture members take their textures right after
+    // the output, in the order given; the textures of the partial forms come
+    // in the same order after the output. For rugged, oil pastel and
+    // impressionist, in and out must be different arrays (they read
+    // neighbouring pixels).
+
+    /** Turquoise: the picture compressed to 70 % of its range over a blue-green floor (black becomes (19, 29, 51)). */
+    public static native void applyTurquoise(int[] in, int[] out, int width, int height);
+
+    /** Turquoise of the selected pixels. */
+    public static native void applyTurquoisePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Rainbow: a diagonal rainbow laid over the picture, sparing deep shadows. */
+    public static native void applyRainbow(int[] in, int[] out, int width, int height);
+
+    /** Rainbow of the selected pixels. */
+    public static native void applyRainbowPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Gothic noir: hard, cold black and white with a heavy dark frame; strong reds stay as crimson. */
+    public static native void applyGothicNoir(int[] in, int[] out, int width, int height);
+
+    /** Gothic noir of the selected pixels. */
+    public static native void applyGothicNoirPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Vignette: soft round darkening towards the corners (to 0.3 in the corners). */
+    public static native void applyVignette(int[] in, int[] out, int width, int height);
+
+    /** Vignette of the selected pixels. */
+    public static native void applyVignettePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /**
+     * Rugged: gritty, weathered sandstone look (local contrast, muted warm
+     * colour). {@code grain}: a neutral grain picture around mid-grey, overlaid
+     * at half strength.
+     */
+    public static native void applyRugged(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Rugged of the selected pixels. */
+    public static native void applyRuggedPartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /**
+     * Oil pastel: waxy, softly banded colours on paper. {@code grain}: a
+     * neutral grain picture; where its brightness is below about half the
+     * paper shows through.
+     */
+    public static native void applyOilPastel(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Oil pastel of the selected pixels. */
+    public static native void applyOilPastelPartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /** Noir note: soft, warm-toned black-and-white film print; {@code grain} (around mid-grey) is its film grain. */
+    public static native void applyNoirNote(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Noir note of the selected pixels. */
+    public static native void applyNoirNotePartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /**
+     * Impressionist: dabs of bright, posterised paint on canvas.
+     * {@code strokes}: its red moves each sample across and its blue moves it
+     * down, by up to about 1 % of the shorter side (mid-grey: no move);
+     * {@code canvas}: its brightness shades the paint (canvas weave).
+     */
+    public static native void applyImpressionist(int[] in, int[] out, int[] strokes, int[] canvas, int width,
+            int height);
+
+    /** Impressionist of the selected pixels. */
+    public static native void applyImpressionistPartial(int[] in, byte[] mask, int[] out, int[] strokes,
+            int[] canvas, int width, int height, Rect rect);
+
+    /**
+     * Stucchevole: a sugary candy-pastel postcard. {@code glow} is screened
+     * over (mostly black, light where it glows), {@code paper} shades it,
+     * {@code sparkle} (mostly black) is added as glitter.
+     */
+    public static native void applyStucchevole(int[] in, int[] out, int[] glow, int[] paper, int[] sparkle,
+            int width, int height);
+
+    /** Stucchevole of the selected pixels. */
+    public static native void applyStucchevolePartial(int[] in, byte[] mask, int[] out, int[] glow, int[] paper,
+            int[] sparkle, int width, int height, Rect rect);
 
     // (end of filters)
 

@@ -141,4 +141,65 @@ class FiltersTest {
             assertEquals(1, e[1]);
         }
     }
+
+    @Nested
+    class ShaderStyle {
+        @Test
+        void turquoiseOfBlackAndWhiteKeepsAlpha() {
+            int[] out = new int[W * H];
+            Engine.applyTurquoise(filled(0x33000000), out, W, H);
+            assertArrayEquals(filled(0x33131D33), out);
+            Engine.applyTurquoise(filled(0xFFFFFFFF), out, W, H);
+            assertArrayEquals(filled(0xFFC6CFE6), out);
+        }
+
+        @Test
+        void partialLeavesUnselectedOutputUntouched() {
+            int[] in = picture(9);
+            int[] whole = new int[W * H];
+            Engine.applyRainbow(in, whole, W, H);
+            byte[] mask = new byte[W * H];
+            mask[2] = 1;
+            mask[3] = 2;
+            int[] out = filled(4);
+            Engine.applyRainbowPartial(in, mask, out, W, H, new Rect(0, 0, 5, 0));
+            for (int i = 0; i < out.length; i++) {
+                assertEquals(i == 2 ? whole[i] : 4, out[i], "pixel " + i);
+            }
+            out = filled(4);
+            Engine.applyGothicNoirPartial(in, null, out, W, H, Rect.whole());
+            int[] noir = new int[W * H];
+            Engine.applyGothicNoir(in, noir, W, H);
+            assertArrayEquals(noir, out);
+        }
+
+        @Test
+        void textureMembersTakeTheirTexturesInOrder() {
+            int[] in = picture(10);
+            int[] a = new int[W * H];
+            int[] b = new int[W * H];
+            Engine.applyStucchevole(in, a, picture(11), picture(12), picture(13), W, H);
+            Engine.applyStucchevole(in, b, picture(13), picture(12), picture(11), W, H);
+            assertNotEquals(Arrays.toString(a), Arrays.toString(b));
+            int[] c = filled(0);
+            Engine.applyStucchevolePartial(in, null, c, picture(11), picture(12), picture(13), W, H, Rect.whole());
+            assertArrayEquals(a, c);
+            int[] d = new int[W * H];
+            int[] e = filled(0);
+            Engine.applyImpressionist(in, d, picture(14), picture(15), W, H);
+            Engine.applyImpressionistPartial(in, null, e, picture(14), picture(15), W, H, Rect.whole());
+            assertArrayEquals(d, e);
+        }
+
+        @Test
+        void refusedArraysWriteNothing() {
+            int[] out = filled(6);
+            Engine.applyNoirNote(picture(1), out, null, W, H);
+            Engine.applyRugged(picture(1), out, new int[1], W, H);
+            Engine.applyOilPastelPartial(picture(1), new byte[1], out, picture(2), W, H, new Rect(0, 0, 1, 1));
+            Engine.applyVignette(null, out, W, H);
+            Engine.applyStucchevolePartial(picture(1), null, out, picture(2), picture(3), null, W, H, Rect.whole());
+            assertArrayEquals(filled(6), out);
+        }
+    }
 }
