@@ -176,6 +176,7 @@ public final class Operations {
         ops.addAll(EffectOperations.list());
 
         // filters
+        ops.addAll(FilterOperations.list());
 
         // geometry
         ops.addAll(GeometryOperations.list());

@@ -353,6 +353,226 @@ public final class Engine {
     // (end of effects of the effect library)
 
     // ---- filters: texture overlays, tone curves, shader-style looks ----
+    // Whole-picture methods take (in, out, [textures...], width, height) and
+    // write every output pixel. Partial methods take (in, mask, out,
+    // [textures...], width, height, rect): the filter is worked out for the
+    // whole picture and copied into the output only where the mask byte is 1
+    // inside the rectangle, or everywhere for an empty rectangle. Every other
+    // output pixel keeps what the output held, so pass an output that already
+    // holds the current picture (a copy of in). Textures are pictures of the
+    // picture's size, never scaled. Alpha comes from the input. No status:
+    // refused arguments (null or short arrays, bad sizes, a rectangle wholly
+    // outside) leave the output untouched and log one line. The caller owns
+    // every array; none is kept after the call.
+
+    // Texture overlays: a prepared look, then the texture screened over it.
+    // A screen texture is mostly black with light where it should glow.
+
+    /** Dawn cast: warm, slightly dark look, screened with {@code screen}, then overlaid with {@code overlay} (overlay weight = its alpha). */
+    public static native void applyDawnCast(int[] in, int[] out, int[] overlay, int[] screen, int width, int height);
+
+    /** Dawn cast of the selected pixels. */
+    public static native void applyDawnCastPartial(int[] in, byte[] mask, int[] out, int[] overlay, int[] screen,
+            int width, int height, Rect rect);
+
+    /** Light streak: more contrast, a little darker and less saturated, the streak texture screened over. */
+    public static native void applyLightStreak(int[] in, int[] out, int[] texture, int width, int height);
+
+    /** Light streak of the selected pixels. */
+    public static native void applyLightStreakPartial(int[] in, byte[] mask, int[] out, int[] texture, int width,
+            int height, Rect rect);
+
+    /** Stardust: slightly warm, contrasty look with the star texture screened over. */
+    public static native void applyStardust(int[] in, int[] out, int[] texture, int width, int height);
+
+    /** Stardust of the selected pixels. */
+    public static native void applyStardustPartial(int[] in, byte[] mask, int[] out, int[] texture, int width,
+            int height, Rect rect);
+
+    /** Sunburst: brighter and contrasty, with the sun texture screened over. */
+    public static native void applySunburst(int[] in, int[] out, int[] texture, int width, int height);
+
+    /** Sunburst of the selected pixels. */
+    public static native void applySunburstPartial(int[] in, byte[] mask, int[] out, int[] texture, int width,
+            int height, Rect rect);
+
+    /** Light flare: bright, saturated look with the flare texture screened over. */
+    public static native void applyLightFlare(int[] in, int[] out, int[] texture, int width, int height);
+
+    /** Light flare of the selected pixels. */
+    public static native void applyLightFlarePartial(int[] in, byte[] mask, int[] out, int[] texture, int width,
+            int height, Rect rect);
+
+    /** Old photo on paper: a brownish tone mixed three parts to one with the paper texture, softer contrast. */
+    public static native void applyOldPhotoTexture(int[] in, int[] out, int[] texture, int width, int height);
+
+    /** Old photo on paper of the selected pixels. */
+    public static native void applyOldPhotoTexturePartial(int[] in, byte[] mask, int[] out, int[] texture,
+            int width, int height, Rect rect);
+
+    // Tone-curve looks.
+
+    /** Retro: faded, lightly desaturated colours with a touch of contrast. */
+    public static native void applyRetro(int[] in, int[] out, int width, int height);
+
+    /** Retro of the selected pixels. */
+    public static native void applyRetroPartial(int[] in, byte[] mask, int[] out, int width, int height, Rect rect);
+
+    /** Yellow glow: faded, warm and bright with a yellow-green cast. */
+    public static native void applyYellowglow(int[] in, int[] out, int width, int height);
+
+    /** Yellow glow of the selected pixels. */
+    public static native void applyYellowglowPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Nostalgia: bright, faded and warm. */
+    public static native void applyNostalgia(int[] in, int[] out, int width, int height);
+
+    /** Nostalgia of the selected pixels. */
+    public static native void applyNostalgiaPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Blue wash: cool, less saturated, a little brighter. */
+    public static native void applyBluewash(int[] in, int[] out, int width, int height);
+
+    /** Blue wash of the selected pixels. */
+    public static native void applyBluewashPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Sunshine: warm, golden and contrasty. */
+    public static native void applySunshine(int[] in, int[] out, int width, int height);
+
+    /** Sunshine of the selected pixels. */
+    public static native void applySunshinePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** The effect library's vintage look ({@link #applyVintage}) on the selected pixels. */
+    public static native void applyVintagePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Old photo: a faded sepia print (luma squeezed into 20..224, toned brown in the mid-tones). */
+    public static native void applyOldPhoto(int[] in, int[] out, int width, int height);
+
+    /** Old photo of the selected pixels. */
+    public static native void applyOldPhotoPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Down-light: light from above, from about 1.16 times brighter on the top row to about half on the bottom row. */
+    public static native void applyDownlight(int[] in, int[] out, int width, int height);
+
+    /** Down-light of the selected pixels. */
+    public static native void applyDownlightPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Soft glow: highlights bloom softly (a blur of the bright parts screened over the picture). */
+    public static native void applySoftglow(int[] in, int[] out, int width, int height);
+
+    /** Soft glow of the selected pixels. */
+    public static native void applySoftglowPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Pop art: a poster in four flat inks (deep blue, magenta, orange, yellow) by brightness. */
+    public static native void applyPopArt(int[] in, int[] out, int width, int height);
+
+    /** Sharpen along rows: each pixel is pushed away from the mean of its left and right neighbours. */
+    public static native void applySharpen(int[] in, int[] out, int width, int height);
+
+    /**
+     * Sharpen of the pixels whose mask byte is 1, anywhere in the picture (a
+     * non-empty rectangle does not bound it); the others are copied from in.
+     * With an empty rectangle every pixel is sharpened and the caller's mask
+     * is rewritten: it is left all 0 (it must then hold width * height bytes
+     * when given; a null mask is allowed).
+     */
+    public static native void applySharpenPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+    // Shader-style effects. Texture members take their textures right after
+    // the output, in the order given; the textures of the partial forms come
+    // in the same order after the output. For rugged, oil pastel and
+    // impressionist, in and out must be different arrays (they read
+    // neighbouring pixels).
+
+    /** Turquoise: the picture compressed to 70 % of its range over a blue-green floor (black becomes (19, 29, 51)). */
+    public static native void applyTurquoise(int[] in, int[] out, int width, int height);
+
+    /** Turquoise of the selected pixels. */
+    public static native void applyTurquoisePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Rainbow: a diagonal rainbow laid over the picture, sparing deep shadows. */
+    public static native void applyRainbow(int[] in, int[] out, int width, int height);
+
+    /** Rainbow of the selected pixels. */
+    public static native void applyRainbowPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Gothic noir: hard, cold black and white with a heavy dark frame; strong reds stay as crimson. */
+    public static native void applyGothicNoir(int[] in, int[] out, int width, int height);
+
+    /** Gothic noir of the selected pixels. */
+    public static native void applyGothicNoirPartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /** Vignette: soft round darkening towards the corners (to 0.3 in the corners). */
+    public static native void applyVignette(int[] in, int[] out, int width, int height);
+
+    /** Vignette of the selected pixels. */
+    public static native void applyVignettePartial(int[] in, byte[] mask, int[] out, int width, int height,
+            Rect rect);
+
+    /**
+     * Rugged: gritty, weathered sandstone look (local contrast, muted warm
+     * colour). {@code grain}: a neutral grain picture around mid-grey, overlaid
+     * at half strength.
+     */
+    public static native void applyRugged(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Rugged of the selected pixels. */
+    public static native void applyRuggedPartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /**
+     * Oil pastel: waxy, softly banded colours on paper. {@code grain}: a
+     * neutral grain picture; where its brightness is below about half the
+     * paper shows through.
+     */
+    public static native void applyOilPastel(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Oil pastel of the selected pixels. */
+    public static native void applyOilPastelPartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /** Noir note: soft, warm-toned black-and-white film print; {@code grain} (around mid-grey) is its film grain. */
+    public static native void applyNoirNote(int[] in, int[] out, int[] grain, int width, int height);
+
+    /** Noir note of the selected pixels. */
+    public static native void applyNoirNotePartial(int[] in, byte[] mask, int[] out, int[] grain, int width,
+            int height, Rect rect);
+
+    /**
+     * Impressionist: dabs of bright, posterised paint on canvas.
+     * {@code strokes}: its red moves each sample across and its blue moves it
+     * down, by up to about 1 % of the shorter side (mid-grey: no move);
+     * {@code canvas}: its brightness shades the paint (canvas weave).
+     */
+    public static native void applyImpressionist(int[] in, int[] out, int[] strokes, int[] canvas, int width,
+            int height);
+
+    /** Impressionist of the selected pixels. */
+    public static native void applyImpressionistPartial(int[] in, byte[] mask, int[] out, int[] strokes,
+            int[] canvas, int width, int height, Rect rect);
+
+    /**
+     * Stucchevole: a sugary candy-pastel postcard. {@code glow} is screened
+     * over (mostly black, light where it glows), {@code paper} shades it,
+     * {@code sparkle} (mostly black) is added as glitter.
+     */
+    public static native void applyStucchevole(int[] in, int[] out, int[] glow, int[] paper, int[] sparkle,
+            int width, int height);
+
+    /** Stucchevole of the selected pixels. */
+    public static native void applyStucchevolePartial(int[] in, byte[] mask, int[] out, int[] glow, int[] paper,
+            int[] sparkle, int width, int height, Rect rect);
 
     // (end of filters)
 

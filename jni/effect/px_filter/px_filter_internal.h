@@ -1,0 +1,70 @@
+// Pieces shared by the filter sources: the partial-form frame and a pixel
+// loop over two pictures.
+#pragma once
+
+#include <cstdint>
+#include <cstring>
+#include <type_traits>
+
+#include "../kalo/if_utils_and.h"
+#include "../kalo/px_mem.h"
+#include "../kalo/px_parallel.h"
+#include "../px_types.h"
+
+namespace px_filter {
+
+// Runs `whole(scratch)` into a zero-filled working picture, then copies it
+// to the output: the selected pixels of a non-empty rectangle (clipped to the
+// picture), or everything for an empty one. Pixels not copied keep what the
+// output held. Returns false (logged, output untouched) when the working
+// picture cannot be allocated.
+template <class Whole>
+bool partial(const char* func, int* out, const unsigned char* mask, int width, int height, int left, int right,
+             int top, int bottom, Whole whole) {
+  if (!out || width <= 0 || height <= 0) return false;
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  auto* scratch = static_cast<int*>(px_calloc(n, 4));
+  if (!scratch) {
+    if_error_msg(func, __LINE__, "Low memory: %s\n", func);
+    return false;
+  }
+  if constexpr (std::is_same_v<decltype(whole(scratch)), bool>) {
+    if (!whole(scratch)) {
+      px_free(scratch);
+      return false;
+    }
+  } else {
+    whole(scratch);
+  }
+  const px_rect r{left, right, top, bottom};
+  if (px_rect_empty(r)) {
+    std::memcpy(out, scratch, n * 4);
+  } else if (mask) {
+    const px_rect c = px_rect_clip(r, width, height);
+    for (int y = c.top; y <= c.bottom; ++y) {
+      const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+      for (int x = c.left; x <= c.right; ++x) {
+        if (mask[row + x] == 1) out[row + x] = scratch[row + x];
+      }
+    }
+  }
+  px_free(scratch);
+  return true;
+}
+
+// out[i] = fn(a[i], b[i]) over the whole picture, in row bands.
+template <class Fn>
+void map2(const int* a, const int* b, int* out, int width, int height, Fn fn) {
+  if (width <= 0 || height <= 0) return;
+  const auto* pa = reinterpret_cast<const uint32_t*>(a);
+  const auto* pb = reinterpret_cast<const uint32_t*>(b);
+  auto* po = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      po[i] = fn(pa[i], pb[i]);
+    }
+  });
+}
+
+}  // namespace px_filter

@@ -1,0 +1,116 @@
+// Texture-overlay filters: a prepared look from a fixed chain of the
+// whole-picture adjustments, then the caller's texture screened or overlaid.
+#include <cstdint>
+
+#include "../px_color/px_hue.h"
+#include "../px_color/px_region.h"
+#include "../px_color/px_tone.h"
+#include "px_filter.h"
+#include "px_filter_internal.h"
+
+void px_blend_texture_with_screen(int* image, int* out, int* texture, int width, int height) {
+  px_filter::map2(image, texture, out, width, height, [](uint32_t p, uint32_t t) -> uint32_t {
+    if ((p >> 24) == 0) return 0;
+    uint32_t o = p & 0xFF000000u;
+    for (int s = 0; s <= 16; s += 8) {
+      const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+      o |= (255u - (((255u - c) * (255u - k)) >> 8)) << s;  // divides by 256: 0 with 0 gives 1
+    }
+    return o;
+  });
+}
+
+void px_blend_texture_with_overlay(int* image, int* out, int* texture, int width, int height) {
+  px_filter::map2(image, texture, out, width, height, [](uint32_t p, uint32_t t) -> uint32_t {
+    const uint32_t ia = p >> 24, ta = t >> 24;
+    if (ia == 0) return 0;
+    uint32_t o = p & 0xFF000000u;
+    for (int s = 0; s <= 16; s += 8) {
+      const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+      const uint32_t v = c < 128 ? (k * c) >> 7 : 255u - (((255u - k) * (255u - c)) >> 7);
+      // The mix weight of the picture is ta XOR ia (255 - ta when opaque).
+      // For a translucent picture the sum can pass 255; it is held at 255.
+      const uint32_t m = (ta * v + c * (ta ^ ia)) >> 8;
+      o |= (m > 255u ? 255u : m) << s;
+    }
+    return o;
+  });
+}
+
+void px_apply_dawncast_texture(int* in, int* out, int* overlay, int* screen, int width, int height) {
+  px_control_brightness_all(in, out, width, height, 9);
+  px_control_contrast_all(out, out, width, height, 13);
+  px_control_exposure_all(out, out, width, height, 8);
+  px_adjust_RGB_all(out, out, width, height, 11, 10, 10);
+  px_control_saturation_all(out, out, width, height, 9);
+  px_blend_texture_with_screen(out, out, screen, width, height);
+  px_blend_texture_with_overlay(out, out, overlay, width, height);
+}
+
+void px_apply_lightstreak_texture(int* in, int* out, int* texture, int width, int height) {
+  px_control_contrast_all(in, out, width, height, 12);
+  px_control_exposure_all(out, out, width, height, 8);
+  px_control_saturation_all(out, out, width, height, 9);
+  px_blend_texture_with_screen(out, out, texture, width, height);
+}
+
+void px_apply_stardust_texture(int* in, int* out, int* texture, int width, int height) {
+  px_control_exposure_all(in, out, width, height, 9);
+  px_control_contrast_all(out, out, width, height, 12);
+  px_adjust_RGB_all(out, out, width, height, 12, 10, 10);
+  px_control_brightness_all(out, out, width, height, 11);
+  px_control_saturation_all(out, out, width, height, 9);
+  px_blend_texture_with_screen(out, out, texture, width, height);
+}
+
+void px_apply_sunburst_texture(int* in, int* out, int* texture, int width, int height) {
+  px_control_exposure_all(in, out, width, height, 11);
+  px_control_contrast_all(out, out, width, height, 13);
+  px_control_saturation_all(out, out, width, height, 9);
+  px_blend_texture_with_screen(out, out, texture, width, height);
+}
+
+void px_apply_lightflare_texture(int* in, int* out, int* texture, int width, int height) {
+  px_control_exposure_all(in, out, width, height, 8);
+  px_control_contrast_all(out, out, width, height, 12);
+  px_control_brightness_all(out, out, width, height, 13);
+  px_control_saturation_all(out, out, width, height, 12);
+  px_blend_texture_with_screen(out, out, texture, width, height);
+}
+
+// Colour tone of 14 degrees, three parts picture to one part texture, then a
+// little less contrast. A pixel left transparent by the tone becomes the
+// texture's alpha moved to the lowest byte (texture >> 24), as it always has.
+void px_apply_oldphoto_texture(int* in, int* out, int* texture, int width, int height) {
+  px_change_colortone(in, out, width, height, 14);
+  px_filter::map2(out, texture, out, width, height, [](uint32_t p, uint32_t t) -> uint32_t {
+    if ((p >> 24) == 0) return t >> 24;
+    uint32_t o = p & 0xFF000000u;
+    for (int s = 0; s <= 16; s += 8) {
+      o |= (((3u * ((p >> s) & 255)) + ((t >> s) & 255)) >> 2) << s;
+    }
+    return o;
+  });
+  px_control_contrast_all(out, out, width, height, 9);
+}
+
+// ---- partial forms -----------------------------------------------------------
+
+void px_apply_dawncast_texture_partial(int* in, int* out, int* overlay, int* screen, unsigned char* mask, int width,
+                                       int height, int left, int right, int top, int bottom) {
+  px_filter::partial(__func__, out, mask, width, height, left, right, top, bottom,
+                     [&](int* s) { px_apply_dawncast_texture(in, s, overlay, screen, width, height); });
+}
+
+#define PX_TEXTURE_PARTIAL(name)                                                                             \
+  void px_apply_##name##_texture_partial(int* in, int* out, int* texture, unsigned char* mask, int width,    \
+                                         int height, int left, int right, int top, int bottom) {             \
+    px_filter::partial(__func__, out, mask, width, height, left, right, top, bottom,                         \
+                       [&](int* s) { px_apply_##name##_texture(in, s, texture, width, height); });           \
+  }
+
+PX_TEXTURE_PARTIAL(lightstreak)
+PX_TEXTURE_PARTIAL(stardust)
+PX_TEXTURE_PARTIAL(sunburst)
+PX_TEXTURE_PARTIAL(lightflare)
+PX_TEXTURE_PARTIAL(oldphoto)

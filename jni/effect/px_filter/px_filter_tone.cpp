@@ -1,0 +1,420 @@
+// Tone-curve filters: named looks from fixed recipes of the whole-picture
+// adjustments, gamma curves and levels remappings, and the looks built on
+// them (old photo, down-light, pop art, soft glow, sharpen).
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+
+#include "../kalo/iel/iel.h"
+#include "../px_color/px_auto_adjust.h"
+#include "../px_color/px_fixed.h"
+#include "../px_color/px_hue.h"
+#include "../px_color/px_region.h"
+#include "../px_color/px_tone.h"
+#include "px_filter.h"
+#include "px_filter_internal.h"
+
+// ---- recipes ---------------------------------------------------------------
+
+void px_apply_retro(int* in, int* out, int width, int height) {
+  px_control_saturation_all(in, out, width, height, 5);
+  px_control_brightness_all(out, out, width, height, 12);
+  px_control_fadedcolor_all(out, out, width, height, 50);
+  px_control_saturation_all(out, out, width, height, 7);
+  px_control_contrast_all(out, out, width, height, 9);
+  px_control_brightness_all(out, out, width, height, 11);
+  px_control_contrast_all(out, out, width, height, 12);
+}
+
+void px_apply_yellowglow(int* in, int* out, int width, int height) {
+  px_control_fadedcolor_all(in, out, width, height, 50);
+  px_control_temperature_all(out, out, width, height, 12);
+  px_control_exposure_all(out, out, width, height, 13);
+  px_control_saturation_all(out, out, width, height, 8);
+  px_adjust_RGB_all(out, out, width, height, 13, 14, 9);
+  px_control_contrast_all(out, out, width, height, 13);
+}
+
+void px_apply_nostalgia(int* in, int* out, int width, int height) {
+  px_control_brightness_all(in, out, width, height, 12);
+  px_control_fadedcolor_all(out, out, width, height, 50);
+  px_control_exposure_all(out, out, width, height, 11);
+  px_control_saturation_all(out, out, width, height, 7);
+  px_control_temperature_all(out, out, width, height, 13);
+}
+
+void px_apply_bluewash(int* in, int* out, int width, int height) {
+  px_control_contrast_all(in, out, width, height, 12);
+  px_control_saturation_all(out, out, width, height, 7);
+  px_control_temperature_all(out, out, width, height, 6);
+  px_control_exposure_all(out, out, width, height, 11);
+  px_adjust_RGB_all(out, out, width, height, 10, 9, 11);
+}
+
+void px_apply_sunshine(int* in, int* out, int width, int height) {
+  px_control_contrast_all(in, out, width, height, 11);
+  px_control_temperature_all(out, out, width, height, 14);
+  px_adjust_RGB_all(out, out, width, height, 11, 12, 8);
+  px_control_contrast_all(out, out, width, height, 11);
+}
+
+// ---- gamma, greyscale, vignette ----------------------------------------------
+
+void px_make_gamma_table(double gamma, uint8_t table[256]) {
+  for (int i = 0; i < 256; ++i) {
+    const double v = 255.0 * std::pow(i / 255.0, 1.0 / gamma) + 0.5;
+    const int t = v >= 255.0 ? 255 : (v > 0.0 ? static_cast<int>(v) : 0);  // NaN gives 0
+    table[i] = static_cast<uint8_t>(t);
+  }
+}
+
+void control_gamma(int* in, int* out, int width, int height, int channel, double gamma) {
+  if (!in || !out || channel < 0 || channel > 3) return;
+  uint8_t t[256];
+  px_make_gamma_table(gamma, t);
+  // Byte shift of each selected channel; the other bytes pass unchanged.
+  const bool r = channel == 0 || channel == 1, g = channel == 0 || channel == 2, b = channel == 0 || channel == 3;
+  px_map_pixels(in, out, width, height, [&](uint32_t p) -> uint32_t {
+    uint32_t o = p;
+    if (r) o = (o & 0xFF00FFFFu) | static_cast<uint32_t>(t[(p >> 16) & 255]) << 16;
+    if (g) o = (o & 0xFFFF00FFu) | static_cast<uint32_t>(t[(p >> 8) & 255]) << 8;
+    if (b) o = (o & 0xFFFFFF00u) | t[p & 255];
+    return o;
+  });
+}
+
+void px_apply_greyscale_all(int* in, int* out, int width, int height) {
+  if (!in || !out) return;
+  px_map_pixels(in, out, width, height, [](uint32_t p) -> uint32_t {
+    const int v = px_clamp255((static_cast<int>((p >> 16) & 255) + static_cast<int>(p & 255) +
+                               2 * static_cast<int>((p >> 8) & 255)) >> 2);
+    return static_cast<uint32_t>(px_pack_rgb888(static_cast<int>(p), v, v, v));
+  });
+}
+
+void px_apply_vignette(int* in, int* out, int width, int height) {
+  if (!in || !out || width <= 0 || height <= 0) return;
+  if (width < 2 || height < 2) {
+    if (in != out) std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    return;
+  }
+  const int hx = width >> 1, hy = height >> 1;
+  const int64_t kx = (int64_t{1} << 28) / (static_cast<int64_t>(hx) * hx);
+  const int64_t ky = (int64_t{1} << 28) / (static_cast<int64_t>(hy) * hy);
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const int64_t dy = y - hy;
+      const int64_t fy = (int64_t{1} << 28) - ((7 * ky * dy * dy) >> 4);
+      for (int x = 0; x < width; ++x) {
+        const int64_t dx = x - hx;
+        const uint32_t f = static_cast<uint32_t>((fy - ((7 * kx * dx * dx) >> 4)) >> 8);  // 2^20 is one
+        const size_t i = static_cast<size_t>(y) * w + static_cast<size_t>(x);
+        const uint32_t p = src[i];
+        const uint32_t b = ((p & 255u) * f << 4) >> 24;
+        const uint32_t r = ((((p >> 16) & 255u) * f) >> 4) & 0x00FF0000u;
+        const uint32_t g = ((((p >> 8) & 255u) * f) >> 12) & 0x0000FF00u;
+        dst[i] = (p & 0xFF000000u) | r | g | b;
+      }
+    }
+  });
+}
+
+// ---- vintage -------------------------------------------------------------------
+
+namespace {
+// Steps 1 to 8 of the vintage recipe: gamma curves and levels remappings per
+// channel with brightness and contrast between them.
+void vintage_tones(int* in, int* out, int w, int h) {
+  control_gamma(in, out, w, h, 0, 0.77);
+  changeHistogramByInput(out, out, w, h, 1, 28, 255);
+  control_gamma(out, out, w, h, 1, 1.09);
+  control_gamma(out, out, w, h, 2, 1.06);
+  control_gamma(out, out, w, h, 3, 1.15);
+  changeHistogramByOutput(out, out, w, h, 3, 45, 255);
+  px_control_brightness_all(out, out, w, h, 12);
+  px_control_contrast_all(out, out, w, h, 12);
+  changeHistogramByInput(out, out, w, h, 0, 15, 243);
+  control_gamma(out, out, w, h, 0, 1.03);
+  changeHistogramByOutput(out, out, w, h, 0, 0, 238);
+  changeHistogramByInput(out, out, w, h, 1, 49, 255);
+  control_gamma(out, out, w, h, 1, 2.35);
+  changeHistogramByOutput(out, out, w, h, 1, 11, 232);
+  control_gamma(out, out, w, h, 2, 1.15);
+  changeHistogramByOutput(out, out, w, h, 2, 0, 250);
+  control_gamma(out, out, w, h, 3, 0.58);
+  changeHistogramByOutput(out, out, w, h, 3, 56, 238);
+  px_control_contrast_all(out, out, w, h, 12);
+  changeHistogramByOutput(out, out, w, h, 3, 0, 241);
+  changeHistogramByOutput(out, out, w, h, 3, 14, 255);
+}
+}  // namespace
+
+void px_apply_vintage(int* in, int* out, int width, int height) {
+  vintage_tones(in, out, width, height);
+  px_apply_vignette(out, out, width, height);
+  px_control_saturation_all(out, out, width, height, 3);
+}
+
+// Vintage preview: the same colours without the vignette. A preview is often
+// a zoomed or cropped view of the picture, where a darkened frame would sit
+// on the wrong edges; the vignette belongs to the finished picture. The
+// centre pixel, where the vignette is neutral, matches px_apply_vintage.
+void px_apply_vintage_prev(int* in, int* out, int width, int height) {
+  vintage_tones(in, out, width, height);
+  px_control_saturation_all(out, out, width, height, 3);
+}
+
+// Partial vintage: the effect library's vintage look (the one applyVintage
+// shows) on the picture's ARGB pixels, merged by the partial rule. If the
+// effect library refuses the picture, the output is left as it was.
+void px_apply_vintage_partial(int* in, unsigned char* mask, int* out, int width, int height, int left, int right,
+                              int top, int bottom) {
+  if (!in) return;
+  px_filter::partial(__func__, out, mask, width, height, left, right, top, bottom, [&](int* s) {
+    structIELImage a{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(in)};
+    structIELImage b{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(s)};
+    int32_t level = 0;
+    structIELEffectParams params{IEL_EFFECT_VINTAGE, &level, nullptr, 0, 0};
+    return IEL_Apply_Effect(&a, &b, &params) == 0;
+  });
+}
+
+// ---- designed looks ------------------------------------------------------------
+
+namespace {
+// Luma with weights 77, 150, 29 (/256).
+inline int luma(uint32_t p) {
+  return (77 * static_cast<int>((p >> 16) & 255) + 150 * static_cast<int>((p >> 8) & 255) +
+          29 * static_cast<int>(p & 255)) >> 8;
+}
+}  // namespace
+
+// Sepia: red rises and blue falls by v * (255 - v) / 512, the most in the
+// middle greys (128 -> red 159, blue 97) and not at all at black or white.
+int px_get_sepia_r(int v) {
+  v = px_clamp255(v);
+  return px_clamp255(v + ((v * (255 - v)) >> 9));
+}
+int px_get_sepia_b(int v) {
+  v = px_clamp255(v);
+  return px_clamp255(v - ((v * (255 - v)) >> 9));
+}
+
+// Old photo: a faded sepia print. The luma v is squeezed into 20..224 (grey
+// blacks and dull whites of an aged print, v' = 20 + (v * 205 >> 8)), then
+// toned brown: red = sepia_r(v'), green = v', blue = sepia_b(v').
+void px_apply_oldphoto(int* in, int* out, int width, int height) {
+  if (!in || !out) return;
+  px_map_pixels(in, out, width, height, [](uint32_t p) -> uint32_t {
+    const int v = 20 + ((luma(p) * 205) >> 8);
+    return px_argb(p, px_get_sepia_r(v), v, px_get_sepia_b(v));
+  });
+}
+
+// Down-light: light falling from above. Each channel is scaled by a factor
+// running linearly from 296/256 (about 1.16) on the top row to 136/256
+// (about 0.53) on the bottom row, clamped to 255, so the top brightens, the
+// middle stays near its value and the foot of the picture sinks into shade.
+void px_apply_downlight(int* in, int* out, int width, int height) {
+  if (!in || !out || width <= 0 || height <= 0) return;
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  const int span = height > 1 ? height - 1 : 1;
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const int f = 296 - (160 * y) / span;
+      for (size_t i = static_cast<size_t>(y) * w, end = i + w; i < end; ++i) {
+        const uint32_t p = src[i];
+        dst[i] = px_argb(p, px_clamp255((static_cast<int>((p >> 16) & 255) * f) >> 8),
+                         px_clamp255((static_cast<int>((p >> 8) & 255) * f) >> 8),
+                         px_clamp255((static_cast<int>(p & 255) * f) >> 8));
+      }
+    }
+  });
+}
+
+namespace {
+// Pop-art palette by luma band (0..63, 64..127, 128..191, 192..255): deep
+// blue, magenta, orange, lemon yellow: flat poster inks.
+constexpr uint32_t kPopPalette[4] = {0x1A237Eu, 0xE6287Fu, 0xFF9A1Eu, 0xFFEB50u};
+uint32_t popart_pixel(uint32_t p) { return (p & 0xFF000000u) | kPopPalette[luma(p) >> 6]; }
+}  // namespace
+
+// Pop art: a silkscreen print in four flat inks. Contrast 13 first spreads
+// the tones over the bands, then each pixel takes the ink of its luma band
+// (see kPopPalette).
+void px_apply_popart(int* in, int* out, int width, int height) {
+  if (!in || !out) return;
+  px_control_contrast_all(in, out, width, height, 13);
+  px_map_pixels(out, out, width, height, popart_pixel);
+}
+
+// Pop-art preview: the inks straight from the picture's luma, in one pass
+// (no contrast step), for quick previews.
+void px_apply_popart_prev(int* in, int* out, int width, int height) {
+  if (!in || !out) return;
+  px_map_pixels(in, out, width, height, popart_pixel);
+}
+
+namespace {
+// Box blur of radius r (window 2r + 1, edges repeated) of `in` into `out`,
+// per colour channel with integer sums and rounding; alpha from `in`.
+// `tmp` holds width * height words.
+void box_blur(const uint32_t* in, uint32_t* tmp, uint32_t* out, int width, int height, int r) {
+  const int win = 2 * r + 1;
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {  // horizontal
+    for (int y = y0; y < y1; ++y) {
+      const uint32_t* row = in + static_cast<size_t>(y) * w;
+      int s[3] = {0, 0, 0};
+      for (int k = -r; k <= r; ++k) {
+        const uint32_t p = row[k < 0 ? 0 : (k >= width ? width - 1 : k)];
+        s[0] += (p >> 16) & 255, s[1] += (p >> 8) & 255, s[2] += p & 255;
+      }
+      for (int x = 0; x < width; ++x) {
+        tmp[static_cast<size_t>(y) * w + x] =
+            static_cast<uint32_t>((s[0] + r) / win) << 16 | static_cast<uint32_t>((s[1] + r) / win) << 8 |
+            static_cast<uint32_t>((s[2] + r) / win);
+        const int xo = x - r < 0 ? 0 : x - r, xi = x + r + 1 >= width ? width - 1 : x + r + 1;
+        const uint32_t a = row[xo], b = row[xi];
+        s[0] += static_cast<int>((b >> 16) & 255) - static_cast<int>((a >> 16) & 255);
+        s[1] += static_cast<int>((b >> 8) & 255) - static_cast<int>((a >> 8) & 255);
+        s[2] += static_cast<int>(b & 255) - static_cast<int>(a & 255);
+      }
+    }
+  });
+  px_for_rows(width, [&](int x0, int x1) {  // vertical, a band of columns each
+    for (int x = x0; x < x1; ++x) {
+      int s[3] = {0, 0, 0};
+      for (int k = -r; k <= r; ++k) {
+        const uint32_t p = tmp[static_cast<size_t>(k < 0 ? 0 : (k >= height ? height - 1 : k)) * w + x];
+        s[0] += (p >> 16) & 255, s[1] += (p >> 8) & 255, s[2] += p & 255;
+      }
+      for (int y = 0; y < height; ++y) {
+        const size_t i = static_cast<size_t>(y) * w + x;
+        out[i] = (in[i] & 0xFF000000u) | static_cast<uint32_t>((s[0] + r) / win) << 16 |
+                 static_cast<uint32_t>((s[1] + r) / win) << 8 | static_cast<uint32_t>((s[2] + r) / win);
+        const int yo = y - r < 0 ? 0 : y - r, yi = y + r + 1 >= height ? height - 1 : y + r + 1;
+        const uint32_t a = tmp[static_cast<size_t>(yo) * w + x], b = tmp[static_cast<size_t>(yi) * w + x];
+        s[0] += static_cast<int>((b >> 16) & 255) - static_cast<int>((a >> 16) & 255);
+        s[1] += static_cast<int>((b >> 8) & 255) - static_cast<int>((a >> 8) & 255);
+        s[2] += static_cast<int>(b & 255) - static_cast<int>(a & 255);
+      }
+    }
+  }, 16);
+}
+}  // namespace
+
+// Soft glow: the highlights bloom softly into their surroundings. The
+// picture is box-blurred with radius max(1, min(width, height) / 32); the
+// blur is squared (g * g / 255) so only its bright parts glow; that glow is
+// screened over the picture (255 - (255 - c)(255 - g') / 255, rounded).
+// Dark areas stay as they were; skies, skin and lights turn dreamy. When the
+// working pictures cannot be allocated the failure is logged and the output
+// is not written.
+void px_softglow(int* in, int* out, int width, int height) {
+  if (!in || !out || width <= 0 || height <= 0) return;
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  auto* tmp = static_cast<uint32_t*>(px_malloc(n, 4));
+  auto* glow = static_cast<uint32_t*>(px_malloc(n, 4));
+  if (!tmp || !glow) {
+    IF_ERROR("Low memory: %s\n", __func__);
+    px_free(tmp);
+    px_free(glow);
+    return;
+  }
+  const int side = width < height ? width : height;
+  const int r = side / 32 > 1 ? side / 32 : 1;
+  box_blur(reinterpret_cast<const uint32_t*>(in), tmp, glow, width, height, r);
+  px_free(tmp);
+  px_filter::map2(in, reinterpret_cast<int*>(glow), out, width, height, [](uint32_t p, uint32_t g) -> uint32_t {
+    uint32_t o = p & 0xFF000000u;
+    for (int s = 0; s <= 16; s += 8) {
+      const uint32_t c = (p >> s) & 255, gv = (g >> s) & 255;
+      const uint32_t gg = (gv * gv + 127) / 255;
+      o |= (255u - ((255u - c) * (255u - gg) + 127) / 255) << s;
+    }
+    return o;
+  });
+  px_free(glow);
+}
+
+// ---- sharpen -------------------------------------------------------------------
+
+namespace {
+inline uint32_t sharpen_pixel(uint32_t l, uint32_t p, uint32_t r) {
+  uint32_t o = p & 0xFF000000u;
+  for (int s = 0; s <= 16; s += 8) {
+    const int c = static_cast<int>((p >> s) & 255);
+    const int v = 2 * c - ((static_cast<int>((l >> s) & 255) + static_cast<int>((r >> s) & 255)) >> 1);
+    o |= static_cast<uint32_t>(px_clamp255(v)) << s;
+  }
+  return o;
+}
+
+// Sharpens the pixels selected by `sel` (all when null) into a scratch
+// picture, then copies it to the output.
+void sharpen(const int* in, const unsigned char* sel, int* out, int width, int height) {
+  if (!in || !out || width <= 0 || height <= 0) return;
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  auto* scratch = static_cast<uint32_t*>(px_calloc(n, 4));
+  if (!scratch) {
+    IF_ERROR("Low memory: sharpen\n");
+    return;
+  }
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const size_t row = static_cast<size_t>(y) * w;
+      for (int x = 0; x < width; ++x) {
+        const size_t i = row + x;
+        const bool edge = x == 0 || x == width - 1;
+        scratch[i] = edge || (sel && sel[i] != 1) ? src[i] : sharpen_pixel(src[i - 1], src[i], src[i + 1]);
+      }
+    }
+  });
+  std::memcpy(out, scratch, n * 4);
+  px_free(scratch);
+}
+}  // namespace
+
+void px_apply_sharpen_all(int* in, int* out, int width, int height) { sharpen(in, nullptr, out, width, height); }
+
+void px_apply_sharpen(int* in, unsigned char* mask, int* out, int width, int height, int left, int right, int top,
+                      int bottom) {
+  if (!in || !out || width <= 0 || height <= 0) return;
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  const bool whole = left > right || top > bottom;
+  if (whole) {
+    // The caller's mask is set to all 1 for the run and left all 0 after it.
+    if (mask) std::memset(mask, 1, n);
+    sharpen(in, mask, out, width, height);
+    if (mask) std::memset(mask, 0, n);
+    return;
+  }
+  if (!mask) return;
+  sharpen(in, mask, out, width, height);
+}
+
+// ---- partial forms -------------------------------------------------------------
+
+#define PX_TONE_PARTIAL(fn, whole)                                                                          \
+  void fn(int* in, unsigned char* mask, int* out, int width, int height, int left, int right, int top,      \
+          int bottom) {                                                                                     \
+    px_filter::partial(__func__, out, mask, width, height, left, right, top, bottom,                        \
+                       [&](int* s) { whole(in, s, width, height); });                                       \
+  }
+
+PX_TONE_PARTIAL(px_apply_retro_partial, px_apply_retro)
+PX_TONE_PARTIAL(px_apply_yellowglow_partial, px_apply_yellowglow)
+PX_TONE_PARTIAL(px_apply_nostalgia_partial, px_apply_nostalgia)
+PX_TONE_PARTIAL(px_apply_bluewash_partial, px_apply_bluewash)
+PX_TONE_PARTIAL(px_apply_sunshine_partial, px_apply_sunshine)
+PX_TONE_PARTIAL(px_apply_oldphoto_partial, px_apply_oldphoto)
+PX_TONE_PARTIAL(px_apply_downlight_partial, px_apply_downlight)
+PX_TONE_PARTIAL(px_softglow_partial, px_softglow)

@@ -1,0 +1,422 @@
+// Shader-style effects. Channel values are read as doubles in 0..1, worked
+// on with the helpers below, and written back as clamp(v * 255, 0, 255)
+// truncated; alpha is taken from the pixel being recoloured.
+#include "px_gpu_effects.h"
+
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+
+#include "../kalo/if_utils_and.h"
+#include "../kalo/px_parallel.h"
+#include "../px_types.h"
+
+// ---- helpers ---------------------------------------------------------------
+
+float clamp(float a, float lo, float hi) {
+  const float m = a > lo ? a : lo;
+  return m < hi ? m : hi;
+}
+
+double smoothstep(double e0, double e1, double x) {
+  const double t = clamp(static_cast<float>((x - e0) / (e1 - e0)), 0.0f, 1.0f);
+  return t * t * (3.0 - 2.0 * t);
+}
+
+double step(double edge, double x) { return x < edge ? 0.0 : 1.0; }
+
+double length(double x, double y) { return std::sqrt(x * x + y * y); }
+
+double flength(float x, float y) {
+  const double dx = x, dy = y;
+  return std::sqrt(dx * dx + dy * dy);
+}
+
+namespace {
+
+// Truncation with saturation at the 32-bit limits (NaN gives 0).
+int32_t to_int(double v) {
+  if (!(v == v)) return 0;
+  if (v >= 2147483647.0) return INT32_MAX;
+  if (v <= -2147483648.0) return INT32_MIN;
+  return static_cast<int32_t>(v);
+}
+
+struct Col {
+  double r, g, b;
+};
+
+Col read(uint32_t p) {
+  return {((p >> 16) & 255) / 255.0, ((p >> 8) & 255) / 255.0, (p & 255) / 255.0};
+}
+
+uint32_t channel(double v) { return static_cast<uint32_t>(to_int(clamp(static_cast<float>(v * 255.0), 0.0f, 255.0f))); }
+
+uint32_t write(uint32_t alpha_source, Col c) {
+  return (alpha_source & 0xFF000000u) | channel(c.r) << 16 | channel(c.g) << 8 | channel(c.b);
+}
+
+double luma(Col c) { return 0.299 * c.r + 0.587 * c.g + 0.114 * c.b; }
+Col mix(Col a, Col b, double t) { return {a.r + (b.r - a.r) * t, a.g + (b.g - a.g) * t, a.b + (b.b - a.b) * t}; }
+Col grey(double v) { return {v, v, v}; }
+double overlay(double c, double t) { return c < 0.5 ? 2.0 * c * t : 1.0 - 2.0 * (1.0 - c) * (1.0 - t); }
+Col saturate(Col c, double s) { return mix(grey(luma(c)), c, s); }
+
+// Calls fn(x, y, i) for every pixel, in row bands.
+template <class Fn>
+void each_pixel(int width, int height, Fn fn) {
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      for (int x = 0; x < width; ++x) fn(x, y, static_cast<size_t>(y) * w + static_cast<size_t>(x));
+    }
+  });
+}
+
+bool usable(const int* in, const int* out, int width, int height) {
+  return in && out && width > 0 && height > 0;
+}
+
+// A pixel of `p` at (x, y) with the coordinates clamped into the picture.
+uint32_t at(const int* p, int width, int height, int x, int y) {
+  x = x < 0 ? 0 : (x >= width ? width - 1 : x);
+  y = y < 0 ? 0 : (y >= height ? height - 1 : y);
+  return static_cast<uint32_t>(p[static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x)]);
+}
+
+// ---- the looks (true when the output was written) ----------------------------
+
+bool turquoise(int* in, int* out, int width, int height) {
+  if (!usable(in, out, width, height)) return false;
+  each_pixel(width, height, [&](int, int, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    const uint32_t r = static_cast<uint32_t>(to_int(0.7 * ((p >> 16) & 255) + 19.8)) & 255u;
+    const uint32_t g = static_cast<uint32_t>(to_int(0.7 * ((p >> 8) & 255) + 29.1)) & 255u;
+    const uint32_t b = static_cast<uint32_t>(to_int(0.7 * (p & 255) + 51.9)) & 255u;
+    out[i] = static_cast<int>((p & 0xFF000000u) | r << 16 | g << 8 | b);
+  });
+  return true;
+}
+
+// Rainbow: a diagonal rainbow laid over the picture like light through a
+// prism. The rainbow colour at t = (x + y) / (width + height - 2) is
+// 0.5 + 0.5 cos(2 pi (t + k / 3)) for k = 0, 1, 2 (red, green, blue), kept
+// in a table of width + height entries (the working memory). The tint
+// strength s = 0.5 smoothstep(0, 0.35, l) (1 - 0.5 smoothstep(0.75, 1, l))
+// spares deep shadows and half spares highlights; the pixel becomes
+// mix(c, rainbow (0.35 + 0.85 l), s).
+bool rainbow(int* in, int* out, int width, int height) {
+  if (!usable(in, out, width, height)) return false;
+  const int n = width + height;
+  auto* table = static_cast<Col*>(IF_CALLOC(static_cast<int>(sizeof(Col)), n));
+  if (!table) {
+    IF_ERROR("Rainbow effect: Low memory\n");
+    return false;
+  }
+  const double span = n > 2 ? n - 2 : 1;
+  const double two_pi = 6.283185307179586;
+  for (int k = 0; k < n; ++k) {
+    const double t = k / span;
+    table[k] = {0.5 + 0.5 * std::cos(two_pi * t), 0.5 + 0.5 * std::cos(two_pi * (t + 1.0 / 3.0)),
+                0.5 + 0.5 * std::cos(two_pi * (t + 2.0 / 3.0))};
+  }
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    const Col c = read(p);
+    const double l = luma(c);
+    const double s = 0.5 * smoothstep(0.0, 0.35, l) * (1.0 - 0.5 * smoothstep(0.75, 1.0, l));
+    const Col bow = table[x + y];
+    const double lift = 0.35 + 0.85 * l;
+    out[i] = static_cast<int>(write(p, mix(c, {bow.r * lift, bow.g * lift, bow.b * lift}, s)));
+  });
+  IF_FREE(table);
+  return true;
+}
+
+// Squared distances of each column from the centre on a -1..1 scale: the
+// working memory of the two framed looks.
+double* column_distances(int width) {
+  auto* dx2 = static_cast<double*>(IF_CALLOC(static_cast<int>(sizeof(double)), width));
+  if (!dx2) return nullptr;
+  for (int x = 0; x < width; ++x) {
+    const double u = width > 1 ? 2.0 * x / (width - 1) - 1.0 : 0.0;
+    dx2[x] = u * u;
+  }
+  return dx2;
+}
+
+double row_distance(int y, int height) { return height > 1 ? 2.0 * y / (height - 1) - 1.0 : 0.0; }
+
+// Gothic noir: a hard, cold black-and-white of a horror still where only
+// strong reds survive, as dark blood crimson. v = smoothstep(0.12, 0.78, l)
+// crushes the shadows and burns the highlights; the grey is tinted cold
+// (0.92 v, 0.95 v, v). Redness rd = smoothstep(0.25, 0.45, r - max(g, b))
+// step(0.35, r) (true reds only: skin and orange stay grey) mixes in the crimson (0.15 + 0.75 r, 0.02, 0.06). A heavy frame darkens by
+// 1 - 0.7 smoothstep(0.5, 1.35, length(u, v)) on the -1..1 scale.
+bool gothicnoir(int* in, int* out, int width, int height) {
+  if (!usable(in, out, width, height)) return false;
+  double* dx2 = column_distances(width);
+  if (!dx2) {
+    IF_ERROR("GothicNoir effect: Low memory\n");
+    return false;
+  }
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    const Col c = read(p);
+    const double v = smoothstep(0.12, 0.78, luma(c));
+    const double rd = smoothstep(0.25, 0.45, c.r - std::fmax(c.g, c.b)) * step(0.35, c.r);
+    Col o = mix({0.92 * v, 0.95 * v, v}, {0.15 + 0.75 * c.r, 0.02, 0.06}, rd);
+    const double dy = row_distance(y, height);
+    const double frame = 1.0 - 0.7 * smoothstep(0.5, 1.35, length(std::sqrt(dx2[x]), dy));
+    o = {o.r * frame, o.g * frame, o.b * frame};
+    out[i] = static_cast<int>(write(p, o));
+  });
+  IF_FREE(dx2);
+  return true;
+}
+
+// Vignette: the soft, round darkening of an old lens, colours untouched in
+// the middle. d = length(u, v) / sqrt(2) on the -1..1 scale (0 at the
+// centre, 1 in the corners); the picture is scaled by
+// 0.3 + 0.7 smoothstep(1.0, 0.45, d): full inside d = 0.45, 0.3 in the corners.
+bool vignette(int* in, int* out, int width, int height) {
+  if (!usable(in, out, width, height)) return false;
+  double* dx2 = column_distances(width);
+  if (!dx2) {
+    IF_ERROR("vignette effect: Low memory\n");
+    return false;
+  }
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    const Col c = read(p);
+    const double d = length(std::sqrt(dx2[x]), row_distance(y, height)) / 1.4142135623730951;
+    const double f = 0.3 + 0.7 * smoothstep(1.0, 0.45, d);
+    out[i] = static_cast<int>(write(p, {c.r * f, c.g * f, c.b * f}));
+  });
+  IF_FREE(dx2);
+  return true;
+}
+
+// Rugged: weathered sandstone grit. Local contrast first: each channel moves
+// 1.5 times its distance from the mean of the four neighbours (edges
+// repeated); 45 % of the colour goes to grey; a sandstone tint (1.06, 0.98,
+// 0.86) and smoothstep(0.05, 0.95, c) per channel harden it; finally the
+// grain texture's luma g is overlaid at half strength: mix(c, overlay(c, g), 0.5).
+bool rugged(int* in, int* out, int* grain, int width, int height) {
+  if (!usable(in, out, width, height) || !grain) return false;
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    const Col c = read(p);
+    const Col n[4] = {read(at(in, width, height, x - 1, y)), read(at(in, width, height, x + 1, y)),
+                      read(at(in, width, height, x, y - 1)), read(at(in, width, height, x, y + 1))};
+    const Col mean = {(n[0].r + n[1].r + n[2].r + n[3].r) / 4.0, (n[0].g + n[1].g + n[2].g + n[3].g) / 4.0,
+                      (n[0].b + n[1].b + n[2].b + n[3].b) / 4.0};
+    Col d = {c.r + 1.5 * (c.r - mean.r), c.g + 1.5 * (c.g - mean.g), c.b + 1.5 * (c.b - mean.b)};
+    d = mix(d, grey(luma(d)), 0.45);
+    d = {smoothstep(0.05, 0.95, d.r * 1.06), smoothstep(0.05, 0.95, d.g * 0.98), smoothstep(0.05, 0.95, d.b * 0.86)};
+    const double g = luma(read(static_cast<uint32_t>(grain[i])));
+    out[i] = static_cast<int>(write(p, mix(d, {overlay(d.r, g), overlay(d.g, g), overlay(d.b, g)}, 0.5)));
+  });
+  return true;
+}
+
+// Oil pastel: waxy crayon on paper. The 3 x 3 mean (edges repeated) melts
+// fine detail; saturation 1.35 brightens the wax; each channel is
+// posterised softly to 5 bands (floor(5c) + smoothstep(0.35, 0.65, fract(5c)))
+// / 5. Where the grain texture is dark (its luma g below about 0.5) the
+// crayon skips over the paper's tooth: the paper (0.97, 0.95, 0.90) shows
+// through by 0.55 (1 - smoothstep(0.40, 0.52, g)).
+bool oil_pastel(int* in, int* out, int* grain, int width, int height) {
+  if (!usable(in, out, width, height) || !grain) return false;
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    Col m{0, 0, 0};
+    for (int dy = -1; dy <= 1; ++dy) {
+      for (int dx = -1; dx <= 1; ++dx) {
+        const Col k = read(at(in, width, height, x + dx, y + dy));
+        m = {m.r + k.r, m.g + k.g, m.b + k.b};
+      }
+    }
+    Col c = saturate({m.r / 9.0, m.g / 9.0, m.b / 9.0}, 1.35);
+    auto band = [](double v) {
+      const double s = clamp(static_cast<float>(v), 0.0f, 1.0f) * 5.0;
+      const double f = std::floor(s);
+      return (f + smoothstep(0.35, 0.65, s - f)) / 5.0;
+    };
+    c = {band(c.r), band(c.g), band(c.b)};
+    const double g = luma(read(static_cast<uint32_t>(grain[i])));
+    c = mix(c, {0.97, 0.95, 0.90}, 0.55 * (1.0 - smoothstep(0.40, 0.52, g)));
+    out[i] = static_cast<int>(write(p, c));
+  });
+  return true;
+}
+
+// Noir note: a soft black-and-white film print with a warm note. Blacks are
+// lifted and whites held back, v = 0.06 + 0.88 smoothstep(-0.1, 1.1, l);
+// film grain adds 0.18 (g - 0.5) from the grain texture's luma g; the print
+// is toned warm (1.03 v + 0.01, 0.99 v, 0.90 v).
+bool noir_note(int* in, int* out, int* grain, int width, int height) {
+  if (!usable(in, out, width, height) || !grain) return false;
+  each_pixel(width, height, [&](int, int, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    double v = 0.06 + 0.88 * smoothstep(-0.1, 1.1, luma(read(p)));
+    v += 0.18 * (luma(read(static_cast<uint32_t>(grain[i]))) - 0.5);
+    out[i] = static_cast<int>(write(p, {1.03 * v + 0.01, 0.99 * v, 0.90 * v}));
+  });
+  return true;
+}
+
+// Impressionist: short dabs of bright paint on canvas. The stroke texture
+// moves every sample: by (R - 0.5) 2s across and (B - 0.5) 2s down, with
+// s = max(2, min(width, height) / 100) pixels (a grey texture gives
+// diagonal dabs). The sample is saturated 1.3 times and posterised to 8
+// levels a channel, into a working picture. Each pixel then averages five
+// working pixels along the dab's diagonal (offsets -2..2, edges repeated)
+// and is shaded by the canvas texture: c (0.8 + 0.2 canvas luma).
+bool impressionist(int* in, int* out, int* strokes, int* canvas, int width, int height) {
+  if (!usable(in, out, width, height) || !strokes || !canvas) return false;
+  auto* work = static_cast<int*>(IF_CALLOC(4, width * height));
+  if (!work) {
+    IF_ERROR("Low memory: gpu_impressionist\n");
+    return false;
+  }
+  const int side = width < height ? width : height;
+  const double s = side / 100 > 2 ? side / 100 : 2;
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    const Col t = read(static_cast<uint32_t>(strokes[i]));
+    const int sx = x + to_int(std::floor((t.r - 0.5) * 2.0 * s + 0.5));
+    const int sy = y + to_int(std::floor((t.b - 0.5) * 2.0 * s + 0.5));
+    Col c = saturate(read(at(in, width, height, sx, sy)), 1.3);
+    auto level = [](double v) { return std::floor(clamp(static_cast<float>(v), 0.0f, 1.0f) * 7.0 + 0.5) / 7.0; };
+    work[i] = static_cast<int>(write(0, {level(c.r), level(c.g), level(c.b)}));
+  });
+  each_pixel(width, height, [&](int x, int y, size_t i) {
+    Col m{0, 0, 0};
+    for (int k = -2; k <= 2; ++k) {
+      const Col c = read(at(work, width, height, x + k, y + k));
+      m = {m.r + c.r, m.g + c.g, m.b + c.b};
+    }
+    const double shade = 0.8 + 0.2 * luma(read(static_cast<uint32_t>(canvas[i])));
+    out[i] = static_cast<int>(write(static_cast<uint32_t>(in[i]),
+                                    {m.r / 5.0 * shade, m.g / 5.0 * shade, m.b / 5.0 * shade}));
+  });
+  IF_FREE(work);
+  return true;
+}
+
+// Stucchevole ("cloying"): a sugary candy-pastel postcard. The colour moves
+// 30 % toward candy pink (1.0, 0.72, 0.86), is lightened by the power 0.75
+// and flattened to 0.12 + 0.85 c; the glow texture is screened over at 0.7
+// (1 - (1 - c)(1 - 0.7 glow)), the paper texture shades it by
+// 0.9 + 0.1 paper luma, and the sparkle texture adds 0.6 sparkle.
+bool stucchevole(int* in, int* out, int* glow, int* paper, int* sparkle, int width, int height) {
+  if (!usable(in, out, width, height) || !glow || !paper || !sparkle) return false;
+  each_pixel(width, height, [&](int, int, size_t i) {
+    const uint32_t p = static_cast<uint32_t>(in[i]);
+    Col c = mix(read(p), {1.0, 0.72, 0.86}, 0.30);
+    auto sweet = [](double v) { return 0.12 + 0.85 * std::pow(v, 0.75); };
+    c = {sweet(c.r), sweet(c.g), sweet(c.b)};
+    const Col gl = read(static_cast<uint32_t>(glow[i]));
+    c = {1.0 - (1.0 - c.r) * (1.0 - 0.7 * gl.r), 1.0 - (1.0 - c.g) * (1.0 - 0.7 * gl.g),
+         1.0 - (1.0 - c.b) * (1.0 - 0.7 * gl.b)};
+    const double shade = 0.9 + 0.1 * luma(read(static_cast<uint32_t>(paper[i])));
+    const Col sp = read(static_cast<uint32_t>(sparkle[i]));
+    out[i] = static_cast<int>(
+        write(p, {c.r * shade + 0.6 * sp.r, c.g * shade + 0.6 * sp.g, c.b * shade + 0.6 * sp.b}));
+  });
+  return true;
+}
+
+// The partial rule of the family (see the header); `message` is logged as
+// it stands when the scratch picture cannot be allocated.
+template <class Whole>
+void partial(const char* func, const char* message, unsigned char* mask, int* out, int width, int height, int left,
+             int right, int top, int bottom, Whole whole) {
+  if (!out || width <= 0 || height <= 0) return;
+  auto* scratch = static_cast<int*>(IF_CALLOC(4, width * height));
+  if (!scratch) {
+    if_error_msg(func, __LINE__, "%s", message);
+    return;
+  }
+  if (whole(scratch)) {
+    const px_rect r{left, right, top, bottom};
+    if (px_rect_empty(r)) {
+      std::memcpy(out, scratch, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    } else if (mask) {
+      const px_rect c = px_rect_clip(r, width, height);
+      for (int y = c.top; y <= c.bottom; ++y) {
+        const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+        for (int x = c.left; x <= c.right; ++x) {
+          if (mask[row + x] == 1) out[row + x] = scratch[row + x];
+        }
+      }
+    }
+  }
+  IF_FREE(scratch);
+}
+
+}  // namespace
+
+// ---- whole-picture forms -----------------------------------------------------------
+
+void gpu_Turquoise(int* in, int* out, int width, int height) { turquoise(in, out, width, height); }
+void gpu_rainbow(int* in, int* out, int width, int height) { rainbow(in, out, width, height); }
+void gpu_gothicnoir(int* in, int* out, int width, int height) { gothicnoir(in, out, width, height); }
+void gpu_vignette(int* in, int* out, int width, int height) { vignette(in, out, width, height); }
+void gpu_rugged(int* in, int* out, int* grain, int width, int height) { rugged(in, out, grain, width, height); }
+void gpu_oilPastel(int* in, int* out, int* grain, int width, int height) {
+  oil_pastel(in, out, grain, width, height);
+}
+void gpu_noirNote(int* in, int* out, int* grain, int width, int height) { noir_note(in, out, grain, width, height); }
+void gpu_impressionist(int* in, int* out, int* strokes, int* canvas, int width, int height) {
+  impressionist(in, out, strokes, canvas, width, height);
+}
+void gpu_stucchevole(int* in, int* out, int* glow, int* paper, int* sparkle, int width, int height) {
+  stucchevole(in, out, glow, paper, sparkle, width, height);
+}
+
+// ---- partial forms ---------------------------------------------------------------------
+
+#define GPU_PARTIAL(name, look, message)                                                                       \
+  void name(int* in, unsigned char* mask, int* out, int width, int height, int left, int right, int top,       \
+            int bottom) {                                                                                      \
+    partial(__func__, message, mask, out, width, height, left, right, top, bottom,                             \
+            [&](int* s) { return look(in, s, width, height); });                                               \
+  }
+
+GPU_PARTIAL(gpu_Turquoise_partial, turquoise, "Low memory: gpu_Turquoise_partial\n")
+GPU_PARTIAL(gpu_rainbow_partial, rainbow, "Low Memory: gpu_rainbow_partial\n")
+GPU_PARTIAL(gpu_gothicnoir_partial, gothicnoir, "Low Memory: gpu_gothicnoir_partial\n")
+GPU_PARTIAL(gpu_vignette_partial, vignette, "Low Memory: gpu_vignette_partial\n")
+
+// Rugged's partial form logs under its older name, sandstone; oil pastel's
+// under pastelSketch.
+void gpu_rugged_partial(int* in, unsigned char* mask, int* out, int* grain, int width, int height, int left,
+                        int right, int top, int bottom) {
+  partial(__func__, "Low Memory: gpu_sandstone_partial\n", mask, out, width, height, left, right, top, bottom,
+          [&](int* s) { return rugged(in, s, grain, width, height); });
+}
+
+void gpu_oilPastel_partial(int* in, unsigned char* mask, int* out, int* grain, int width, int height, int left,
+                           int right, int top, int bottom) {
+  partial(__func__, "Low Memory: gpu_pastelSketch_partial\n", mask, out, width, height, left, right, top, bottom,
+          [&](int* s) { return oil_pastel(in, s, grain, width, height); });
+}
+
+void gpu_noirNote_partial(int* in, unsigned char* mask, int* out, int* grain, int width, int height, int left,
+                          int right, int top, int bottom) {
+  partial(__func__, "low Memory: gpu_noirNote_partial\n", mask, out, width, height, left, right, top, bottom,
+          [&](int* s) { return noir_note(in, s, grain, width, height); });
+}
+
+void gpu_impressionist_partial(int* in, unsigned char* mask, int* out, int* strokes, int* canvas, int width,
+                               int height, int left, int right, int top, int bottom) {
+  partial(__func__, "Low Memory: gpu_impressionist_partial\n", mask, out, width, height, left, right, top, bottom,
+          [&](int* s) { return impressionist(in, s, strokes, canvas, width, height); });
+}
+
+void gpu_stucchevole_partial(int* in, unsigned char* mask, int* out, int* glow, int* paper, int* sparkle, int width,
+                             int height, int left, int right, int top, int bottom) {
+  partial(__func__, "Low Memory: gpu_stucchevole_partial\n", mask, out, width, height, left, right, top, bottom,
+          [&](int* s) { return stucchevole(in, s, glow, paper, sparkle, width, height); });
+}
