@@ -676,6 +676,38 @@ public final class Engine {
 
     // ---- portrait retouching and red-eye ----
 
+    // Red-eye: the user touches a red pupil; the square of half side
+    // `radius` around the touch point (clipped to the picture) is searched.
+
+    /**
+     * Removes the red of a flash-lit pupil around (x, y), in place: the red
+     * pixels of the square are found by colour ratios, the largest connected
+     * red area is kept, widened by one pixel, and each of its pixels gets the
+     * red (51 R + 614 G + 307 B) >> 10 (green, blue and alpha kept). Fewer
+     * than 5 red marks, a square of one row or a touch outside the picture
+     * change nothing. Refused arguments (null or short array, bad size) are
+     * logged and change nothing.
+     *
+     * @param image  width * height ARGB pixels, changed in place
+     * @param radius half side of the searched square, in pixels
+     */
+    public static native void removeRedeye(int[] image, int width, int height, int x, int y, int radius);
+
+    /**
+     * Quick preview of {@link #removeRedeye}: every pixel of the square with
+     * R > 2.5 G is written into {@code out} with the red 0.05 R + 0.6 G + 0.3 B
+     * (no area analysis); every other pixel of {@code out} is left as the
+     * caller passed it, so pass a copy of {@code in}.
+     *
+     * @param in  width * height ARGB pixels, only read
+     * @param out width * height ARGB pixels
+     */
+    public static native void removeRedeyePreview(int[] in, int[] out, int width, int height, int x, int y,
+            int radius);
+
+    /** Automatic red-eye removal is not offered: does nothing, neither array is touched. */
+    public static native void removeRedeyeAuto(int[] in, int[] out, int width, int height);
+
     // (end of portrait retouching and red-eye)
 
     // ---- backlight correction ----
