@@ -188,6 +188,7 @@ public final class Operations {
         ops.addAll(ObjectOperations.list());
 
         // portrait
+        ops.addAll(PortraitOperations.list());
 
         // backlight
         ops.addAll(BacklightOperations.list());

@@ -896,6 +896,183 @@ public final class Engine {
 
     // ---- portrait retouching and red-eye ----
 
+    // Red-eye: the user touches a red pupil; the square of half side
+    // `radius` around the touch point (clipped to the picture) is searched.
+
+    /**
+     * Removes the red of a flash-lit pupil around (x, y), in place: the red
+     * pixels of the square are found by colour ratios, the largest connected
+     * red area is kept, widened by one pixel, and each of its pixels gets the
+     * red (51 R + 614 G + 307 B) >> 10 (green, blue and alpha kept). Fewer
+     * than 5 red marks, a square of one row or a touch outside the picture
+     * change nothing. Refused arguments (null or short array, bad size) are
+     * logged and change nothing.
+     *
+     * @param image  width * height ARGB pixels, changed in place
+     * @param radius half side of the searched square, in pixels
+     */
+    public static native void removeRedeye(int[] image, int width, int height, int x, int y, int radius);
+
+    /**
+     * Quick preview of {@link #removeRedeye}: every pixel of the square with
+     * R > 2.5 G is written into {@code out} with the red 0.05 R + 0.6 G + 0.3 B
+     * (no area analysis); every other pixel of {@code out} is left as the
+     * caller passed it, so pass a copy of {@code in}.
+     *
+     * @param in  width * height ARGB pixels, only read
+     * @param out width * height ARGB pixels
+     */
+    public static native void removeRedeyePreview(int[] in, int[] out, int width, int height, int x, int y,
+            int radius);
+
+    /** Automatic red-eye removal is not offered: does nothing, neither array is touched. */
+    public static native void removeRedeyeAuto(int[] in, int[] out, int width, int height);
+
+    // Portrait session: initPortrait analyses one photo (faces, eyes, mouths)
+    // and keeps the result until finishPortrait, so the beautifier, lighting
+    // and out-focus can be applied and re-applied without detecting again.
+    // One session at a time, kept in the library (not locked: callers
+    // serialise these methods). Every method that works on the session
+    // returns ERR_NULL when none is open. Full-size forms take
+    // (in, out, width, height, ...) and write all of out; preview forms take
+    // (in, width, height, preview, previewWidth, previewHeight, ...) and
+    // reduce the full-size result by nearest neighbour with one Q12 step,
+    // (int) ((float) (width << 12) / previewWidth), for both axes (preview
+    // pixels whose source falls outside the photo are left as they were).
+    // Arrays: in holds width * height pixels and is only read; out
+    // width * height; preview previewWidth * previewHeight; the caller owns
+    // them all. Levels are not clamped unless said.
+
+    /** Status returned by {@link #getportraitstatus} while a session is open. */
+    public static final int PORTRAIT_OPEN = 1;
+
+    /**
+     * Opens a portrait session on {@code image} (only read): applies the
+     * settings as {@link #setFacebeauty} does, finds faces, eyes and mouths,
+     * and reports them through {@code listener.setFaceInfo(faceCount, faces)}
+     * (9 ints per face; see {@link FaceInfoListener}) before returning. A
+     * session still open is released and replaced.
+     *
+     * @param maxFace  most faces to keep, 1..10 (anything else means 10)
+     * @param level    beautifier level 1..5 (else the setting stays)
+     * @param option   detection 1..4: 1 and 2 upright faces, 3 and 4 also faces
+     *                 turned by 45 degrees (else the setting stays)
+     * @param listener receives the faces; null to skip the report
+     * @return SUCCESS; ERR_NULL for a refused array or size (nothing
+     *         opened); ERR_ALLOC when memory ran
+     *         out (an open session stays as it was)
+     */
+    public static native int initPortrait(int[] image, int width, int height, int maxFace, int level, int option,
+            FaceInfoListener listener);
+
+    /** Closes the portrait session and frees its analysis; harmless without one. */
+    public static native void finishPortrait();
+
+    /** {@link #PORTRAIT_OPEN} while a session is open, else 0. */
+    public static native int getportraitstatus();
+
+    /** The detection setting 1..4 (default 3). */
+    public static native int getDetectOption();
+
+    /** The beautifier level setting 1..5 (default 3). */
+    public static native int getBeautyLevel();
+
+    /** The most faces a session keeps, 1..10 (default 2). */
+    public static native int get_maxFaceCnt();
+
+    /**
+     * Settings for the next session (they outlive sessions): maxFace 1..10
+     * (anything else becomes 10), level 1..5 and option 1..4 (out of range:
+     * the old value stays).
+     */
+    public static native void setFacebeauty(int maxFace, int level, int option);
+
+    /**
+     * One-shot beautifier, no session needed: {@code out} gets {@code in} with
+     * every face found (current settings) smoothed; when no face is found the
+     * whole picture is brightened by a fixed tone curve instead. Alpha kept.
+     *
+     * @return SUCCESS, ERR_ALLOC, or ERR_NULL for refused arguments
+     */
+    public static native int runFacebeauty(int[] in, int[] out, int width, int height);
+
+    /**
+     * Skin beautifier on every face of the session: {@code out} = {@code in}
+     * with the skin of each face smoothed, strongest at the face centre.
+     * Level 1..5 is stored in the session for later calls.
+     *
+     * @param level 0 (out untouched), 1 light .. 5 strongest
+     * @return SUCCESS (out untouched when the session has no face); ERR_NULL
+     *         for a level outside 0..5, no session or refused arguments
+     */
+    public static native int runBeautyInPortrait(int[] in, int[] out, int width, int height, int level);
+
+    /**
+     * As {@link #runBeautyInPortrait} for the face {@code face} (0-based, in
+     * the order reported by initPortrait); an index outside the faces returns
+     * SUCCESS with out untouched.
+     */
+    public static native int runBeautyInPortraitSingleFace(int[] in, int[] out, int width, int height, int level,
+            int face);
+
+    /**
+     * Preview of {@link #runBeautyInPortrait}: level 0 writes {@code in}
+     * reduced; 1..5 the beautified photo reduced (no face: preview untouched).
+     *
+     * @return SUCCESS, ERR_ALLOC, or ERR_NULL (level outside 0..5, no session,
+     *         refused arguments, a preview array shorter than
+     *         previewWidth * previewHeight)
+     */
+    public static native int runBeautyInPortraitPreview(int[] in, int width, int height, int[] preview,
+            int previewWidth, int previewHeight, int level);
+
+    /** Preview of {@link #runBeautyInPortraitSingleFace}. */
+    public static native int runBeautyInPortraitSingleFacePreview(int[] in, int width, int height, int[] preview,
+            int previewWidth, int previewHeight, int level, int face);
+
+    /**
+     * Lighting: {@code out} = {@code in} with a round area around each face
+     * (radius the larger side of the face box) lightened or darkened by
+     * 3 * level - 30 at its centre: 10 neutral (exact copy), 20 lightens by
+     * 30, 0 darkens by 30.
+     *
+     * @return SUCCESS, or ERR_NULL for no session or refused arguments
+     */
+    public static native int runLightenInPortrait(int[] in, int[] out, int width, int height, int level);
+
+    /** Lighting of one face; an index outside the faces gives the plain copy. */
+    public static native int runLightenInPortraitSingleFace(int[] in, int[] out, int width, int height, int level,
+            int face);
+
+    /** Preview of {@link #runLightenInPortrait}; level 10 writes nothing. SUCCESS, ERR_ALLOC or ERR_NULL. */
+    public static native int runLightenInPortraitPreview(int[] in, int width, int height, int[] preview,
+            int previewWidth, int previewHeight, int level);
+
+    /** Preview of {@link #runLightenInPortraitSingleFace}; level 10 writes nothing. */
+    public static native int runLightenInPortraitSingleFacePreview(int[] in, int width, int height, int[] preview,
+            int previewWidth, int previewHeight, int level, int face);
+
+    /**
+     * Out-focus: the photo blurred at {@code strength} (1..7, as
+     * {@link #applyBlur}) except for a sharp area around each face and the
+     * body below it, with soft edges. Mixed pixels become opaque. Strength 0
+     * leaves out untouched.
+     *
+     * @return SUCCESS, ERR_ALLOC, ERR_EFFECT for a negative strength, or
+     *         ERR_NULL for no session or refused arguments
+     */
+    public static native int runOutfocusInPortrait(int[] in, int[] out, int width, int height, int strength);
+
+    /**
+     * Preview of out-focus with the faster out-focus blur (strength 0..7:
+     * radius 3, 7, 15, 31, 41, 49, 55, 63 pixels), reduced into the preview.
+     *
+     * @return SUCCESS, ERR_ALLOC, ERR_EFFECT (negative strength or the blur
+     *         failed), or ERR_NULL
+     */
+    public static native int runOutfocusInPortraitPreview(int[] in, int width, int height, int[] preview,
+            int previewWidth, int previewHeight, int strength);
+
     // (end of portrait retouching and red-eye)
 
     // ---- backlight correction ----
