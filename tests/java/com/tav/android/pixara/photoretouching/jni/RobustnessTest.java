@@ -117,7 +117,12 @@ class RobustnessTest {
                 args[i] = rng.nextDouble() * 4 - 1;
             } else if (t == Rect.class) {
                 args[i] = rect(rng, w, h);
-            } else if (!t.isPrimitive()) {
+            } else if (t.isInterface()) {
+                // A listener that ignores what it is told.
+                args[i] = rng.nextBoolean() ? null
+                        : java.lang.reflect.Proxy.newProxyInstance(t.getClassLoader(), new Class<?>[] {t},
+                                (proxy, method, a) -> null);
+            } else if (t == Object.class) {
                 args[i] = rng.nextBoolean() ? null : new Object();
             } else {
                 throw new AssertionError("no argument maker for " + t + " in " + m.getName());
