@@ -187,6 +187,9 @@ public final class Operations {
         // object tools
         ops.addAll(ObjectOperations.list());
 
+        // faces
+        ops.addAll(FaceOperations.list());
+
         // portrait
         ops.addAll(PortraitOperations.list());
 

@@ -894,6 +894,21 @@ public final class Engine {
 
     // (end of object tools)
 
+    // ---- face analysis ----
+
+    /** Ints a face takes in the report of {@link #analyzeFaces}. */
+    public static final int FACE_REPORT_INTS = 11;
+
+    /**
+     * Finds the faces of a photo with their eyes and mouths. {@code report} receives, for each face
+     * (at most {@code report.length / FACE_REPORT_INTS}, and at most 20): the face box x, y, width,
+     * height; 1 when the eyes were found, else 0; the first eye's x, y; the second eye's x, y; the
+     * mouth centre x, y (-1 when not found), all in photo pixels. {@code mode} 1 finds upright
+     * faces, 3 also faces rolled by about 45 degrees. Returns the number of faces (0..20), or
+     * ERR_NULL for refused arguments, ERR_ALLOC when memory is short.
+     */
+    public static native int analyzeFaces(int[] image, int width, int height, int mode, int[] report);
+
     // ---- portrait retouching and red-eye ----
 
     // Red-eye: the user touches a red pupil; the square of half side
