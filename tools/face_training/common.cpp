@@ -70,3 +70,9 @@ cv::Rect2d face_box_from_eyes(double lx, double ly, double rx, double ry) {
   double mx = (lx + rx) / 2, my = (ly + ry) / 2;
   return cv::Rect2d(mx - kEyeMidX * s, my - kEyeMidY * s, 22 * s, 24 * s);
 }
+
+void split_held_out(std::vector<LandmarkFace>& faces, std::vector<LandmarkFace>* held) {
+  std::vector<LandmarkFace> train;
+  for (size_t i = 0; i < faces.size(); ++i) (i % 10 == 9 && held ? *held : train).push_back(faces[i]);
+  faces.swap(train);
+}

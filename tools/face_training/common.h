@@ -16,6 +16,11 @@ std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::str
 // Grey (R + G + B) / 3 image, as the engine sees it.
 cv::Mat load_grey(const std::string& path);
 std::vector<std::string> list_images(const std::string& dir);
+// Every tenth face of the training list is held out for measuring the eye
+// and mouth error on faces annotated like the training faces.
+void split_held_out(std::vector<LandmarkFace>& faces, std::vector<LandmarkFace>* held);
+// Every fifth scene photo and every fifth wallpaper is held out for evaluation.
+inline bool is_held_out_scene(size_t index) { return index % 5 == 0; }
 
 // Canonical face window: 22 x 24 pixels, eye distance 10, eye midpoint at
 // (11, 7). A detector box for a face is this window scaled onto the face.

@@ -38,8 +38,18 @@ double iou(const cv::Rect2d& a, const cv::Rect2d& b) {
   return in / (a.area() + b.area() - in);
 }
 
+// Face sizes (width of the box implied by the eyes) for recall per size.
+constexpr int kSizeBins = 4;
+const int kSizeEdges[kSizeBins - 1] = {60, 90, 130};
+int size_bin(double w) {
+  int b = 0;
+  while (b < kSizeBins - 1 && w >= kSizeEdges[b]) ++b;
+  return b;
+}
+
 struct Tally {
   int faces = 0, found = 0, fp = 0;
+  int binFaces[kSizeBins] = {}, binFound[kSizeBins] = {};
   double seconds = 0;
   void add(const std::vector<cv::Rect2d>& truth, const std::vector<cv::Rect2d>& det) {
     std::vector<bool> used(det.size());
@@ -49,7 +59,8 @@ struct Tally {
       double bi = 0.3;
       for (size_t k = 0; k < det.size(); ++k)
         if (!used[k] && iou(t, det[k]) >= bi) bi = iou(t, det[k]), best = k;
-      if (best >= 0) used[best] = true, ++found;
+      ++binFaces[size_bin(t.width)];
+      if (best >= 0) used[best] = true, ++found, ++binFound[size_bin(t.width)];
     }
     for (bool u : used) fp += !u;
   }
@@ -69,6 +80,8 @@ std::vector<cv::Rect2d> run_engine(const cv::Mat& bgr, int mode, FaceEngineInfo*
     ReleaseFaceBeautyPlus(&info);
   return r;
 }
+
+void landmark_eval(const char* title, const std::vector<LandmarkFace>& test);
 
 std::vector<cv::Rect2d> run_cv(cv::CascadeClassifier& c, const cv::Mat& bgr) {
   cv::Mat g;
@@ -94,21 +107,35 @@ int main(int argc, char** argv) {
   const std::string cvdir = argc > 2 ? argv[2] : "/usr/share/opencv4";
   std::mt19937 rng(7);
   std::vector<LandmarkFace> test = load_landmarks(data, "new_testing.txt");
-  std::vector<std::string> scenes = list_images(data + "/images_notfaces");
+  std::vector<LandmarkFace> heldTrain = load_landmarks(data, "new_training.txt");
+  {
+    std::vector<LandmarkFace> held;
+    split_held_out(heldTrain, &held);
+    heldTrain.swap(held);
+  }
+  // Held-out scene photos and wallpapers (when extracted).
+  std::vector<std::string> scenes, all = list_images(data + "/images_notfaces");
+  for (size_t i = 0; i < all.size(); ++i)
+    if (is_held_out_scene(i)) scenes.push_back(all[i]);
+  const size_t sceneCount = scenes.size();
+  all = list_images(data + "/wallpapers");
+  for (size_t i = 0; i < all.size(); ++i)
+    if (is_held_out_scene(i)) scenes.push_back(all[i]);
   cv::CascadeClassifier haar, lbp;
   bool haveCv = haar.load(cvdir + "/haarcascades/haarcascade_frontalface_default.xml") &&
                 lbp.load(cvdir + "/lbpcascades/lbpcascade_frontalface_improved.xml");
 
   // Composite photos from the held-out scenes (every fifth) and faces.
-  Tally eng, engRot, th, tl, sceneOnly;
+  Tally eng, engRot, th, tl, sceneOnly, haarOnly, lbpOnly;
   size_t next = 0;
   int photos = 0;
-  for (size_t i = 0; i < scenes.size() && !std::getenv("FACE_EVAL_LANDMARKS_ONLY"); i += 5) {
+  for (size_t i = 0; i < scenes.size() && !std::getenv("FACE_EVAL_LANDMARKS_ONLY"); ++i) {
     cv::Mat scene = cv::imread(scenes[i], cv::IMREAD_COLOR);
     if (scene.empty()) continue;
     double k = 640.0 / std::max(scene.cols, scene.rows);
     cv::resize(scene, scene, cv::Size(), k, k, cv::INTER_AREA);
     sceneOnly.add({}, run_engine(scene, 1));
+    if (haveCv) haarOnly.add({}, run_cv(haar, scene)), lbpOnly.add({}, run_cv(lbp, scene));
     std::vector<cv::Rect2d> truth;
     std::vector<cv::Rect> placed;
     for (int n = 0; n < 3 && next < test.size(); ++n) {
@@ -149,11 +176,17 @@ int main(int argc, char** argv) {
       tl.seconds += now() - t0;
     }
   }
-  std::printf("Composite photos: %d (held-out scenes, longer side 640, held-out faces 60..200 px)\n", photos);
-  std::printf("| detector | faces | found | recall | false positives | ms per photo |\n|---|---|---|---|---|---|\n");
+  std::printf("Composite photos: %d (%zu held-out scenes and %zu held-out wallpapers, longer side 640, held-out faces "
+              "60..200 px)\n",
+              photos, sceneCount, scenes.size() - sceneCount);
+  std::printf("| detector | faces | found | recall | false positives | ms per photo | recall by box width <60 / 60-90 / "
+              "90-130 / >=130 |\n|---|---|---|---|---|---|---|\n");
   auto row = [&](const char* name, const Tally& t) {
-    std::printf("| %s | %d | %d | %.3f | %d | %.1f |\n", name, t.faces, t.found, t.faces ? double(t.found) / t.faces : 0.0,
+    std::printf("| %s | %d | %d | %.3f | %d | %.1f |", name, t.faces, t.found, t.faces ? double(t.found) / t.faces : 0.0,
                 t.fp, 1000 * t.seconds / std::max(1, photos));
+    for (int b = 0; b < kSizeBins; ++b)
+      std::printf("%s%d/%d", b ? " / " : " ", t.binFound[b], t.binFaces[b]);
+    std::printf(" |\n");
   };
   row("engine, upright (mode 1)", eng);
   row("engine, upright and +-45 (mode 3)", engRot);
@@ -161,13 +194,21 @@ int main(int argc, char** argv) {
     row("OpenCV haarcascade_frontalface_default", th);
     row("OpenCV lbpcascade_frontalface_improved", tl);
   }
-  std::printf("False positives on the %d held-out scenes alone (engine, mode 1): %d\n", photos, sceneOnly.fp);
+  std::printf("False positives on the %d held-out scenes alone: engine (mode 1) %d, Haar %d, LBP %d\n", photos,
+              sceneOnly.fp, haarOnly.fp, lbpOnly.fp);
+  landmark_eval("held-out MTFL test faces (AFLW)", test);
+  landmark_eval("held-out training-list faces (LFW, net_7876: every tenth)", heldTrain);
+  return 0;
+}
+
+namespace {
+void landmark_eval(const char* title, const std::vector<LandmarkFace>& test) {
 
   // Eyes and mouth on held-out landmark faces (photo 80 x 80, analysed whole).
   int n = 0, faceFound = 0, eyesFound = 0, eyesWithin = 0, mouthFound = 0, mouthWithin = 0;
+  std::vector<double> worse;
   double sd[4] = {}, e1 = 0, e2 = 0;
   double eyeErr = 0, mouthErr = 0, boxScale = 0, boxDx = 0, boxDy = 0;
-  const bool landmarksOnly = std::getenv("FACE_EVAL_LANDMARKS_ONLY") != nullptr;
   for (size_t i = 0; i < test.size(); ++i) {
     const LandmarkFace& f = test[i];
     cv::Mat img = cv::imread(f.path, cv::IMREAD_COLOR);
@@ -197,6 +238,7 @@ int main(int argc, char** argv) {
         sd[0] += (e.x1 - f.x[0]) / d, sd[1] += (e.y1 - f.y[0]) / d, sd[2] += (e.x2 - f.x[1]) / d, sd[3] += (e.y2 - f.y[1]) / d;
         e1 += std::hypot(e.x1 - f.x[0], e.y1 - f.y[0]) / d, e2 += std::hypot(e.x2 - f.x[1], e.y2 - f.y[1]) / d;
         eyesWithin += err <= 0.1;
+        worse.push_back(err);
         const SMyPoint2& m = info.mouthCenter[best];
         if (info.mouthRect[best].width > 0) {
           ++mouthFound;
@@ -208,18 +250,21 @@ int main(int argc, char** argv) {
     }
     ReleaseFaceBeautyPlus(&info);
   }
-  std::printf("\nHeld-out landmark faces: %d; face found %d (%.3f)\n", n, faceFound, double(faceFound) / n);
+  std::printf("\n%s: %d; face found %d (%.3f)\n", title, n, faceFound, double(faceFound) / std::max(1, n));
   std::printf("detected box against the landmark box: width ratio %.3f, centre offset (%.3f, %.3f) widths\n",
               boxScale / std::max(1, faceFound), boxDx / std::max(1, faceFound), boxDy / std::max(1, faceFound));
   std::printf("eyes found in %d of the found faces (%.3f); worse eye error: mean %.3f of the eye distance, "
               "%d (%.3f) within 0.10\n",
               eyesFound, double(eyesFound) / std::max(1, faceFound), eyeErr / std::max(1, eyesFound), eyesWithin,
               double(eyesWithin) / std::max(1, eyesFound));
+  std::sort(worse.begin(), worse.end());
+  if (!worse.empty())
+    std::printf("worse eye error median %.3f, 90th percentile %.3f\n", worse[worse.size() / 2], worse[worse.size() * 9 / 10]);
   std::printf("signed mean eye offsets (eye distances): first (%.3f, %.3f), second (%.3f, %.3f); mean error first %.3f, "
               "second %.3f\n",
               sd[0] / std::max(1, eyesFound), sd[1] / std::max(1, eyesFound), sd[2] / std::max(1, eyesFound),
               sd[3] / std::max(1, eyesFound), e1 / std::max(1, eyesFound), e2 / std::max(1, eyesFound));
   std::printf("mouth found in %d faces with eyes; centre error mean %.3f of the eye distance, %d (%.3f) within 0.20\n",
               mouthFound, mouthErr / std::max(1, mouthFound), mouthWithin, double(mouthWithin) / std::max(1, mouthFound));
-  return 0;
 }
+}  // namespace

@@ -233,7 +233,8 @@ void add_face_levels(const cv::Mat& g, std::vector<Level>& levels, const cv::Rec
   }
 }
 
-using LevelScan = std::function<bool(const Level&, int x, int y)>;  // true: window may be a negative
+// True when a window may serve as a negative for the given stage.
+using LevelScan = std::function<bool(const Level&, int x, int y, size_t stage)>;
 
 std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const std::vector<Level>& levels,
                                  int ystep, const LevelScan& negOk, size_t negCount, FILE* report) {
@@ -244,18 +245,31 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const st
     pos.P = allPos.P;
     for (size_t i = 0; i < allPos.size(); ++i)
       if (cascade_row(cascade, allPos.row(i))) pos.codes.insert(pos.codes.end(), allPos.row(i), allPos.row(i) + allPos.P);
+    // Hard negatives: windows that pass the stages so far. When the earlier
+    // stages leave too few, the last of them is relaxed step by step, so that
+    // the new stage learns from the near misses instead of from nothing.
     Reservoir res{negCount, {}, 0};
     res.s.P = allPos.P;
     size_t windows = 0;
-    for (const Level& L : levels)
-      for (int y = 0; y < L.h - sp.wh; y += ystep)
-        for (int x = 0; x < L.w - sp.ww; ++x) {
-          if (!negOk(L, x, y)) continue;
-          ++windows;
-          if (cascade_window(cascade, sp, L.mct.data(), L.w, x, y)) res.offer(sp, L.mct.data(), L.w, x, y);
-        }
-    std::fprintf(report, "%s stage %zu: %zu positives, %zu of %zu negative windows pass the earlier stages (%.2e)\n",
-                 sp.name, k, pos.size(), res.seen, windows, windows ? double(res.seen) / windows : 0.0);
+    for (int relax = 0; relax <= 6; ++relax) {
+      std::vector<Stage> mining = cascade;
+      if (relax && !mining.empty()) mining.back().threshold += mining.back().threshold * relax / 20;
+      res = Reservoir{negCount, {}, 0};
+      res.s.P = allPos.P;
+      windows = 0;
+      for (const Level& L : levels)
+        for (int y = 0; y < L.h - sp.wh; y += ystep)
+          for (int x = 0; x < L.w - sp.ww; ++x) {
+            if (!negOk(L, x, y, k)) continue;
+            ++windows;
+            if (cascade_window(mining, sp, L.mct.data(), L.w, x, y)) res.offer(sp, L.mct.data(), L.w, x, y);
+          }
+      if (res.seen >= negCount / 4 || cascade.empty()) break;
+      std::fprintf(report, "  only %zu negatives pass (last stage relaxed by %d %%); relaxing further\n", res.seen,
+                   relax * 5);
+    }
+    std::fprintf(report, "%s stage %zu: %zu positives, %zu of %zu negative windows mined (%.2e)\n", sp.name, k,
+                 pos.size(), res.seen, windows, windows ? double(res.seen) / windows : 0.0);
     if (res.s.size() < 100) {
       std::fprintf(report, "  too few negatives left; stage trained on what there is\n");
       if (res.s.size() == 0) res.s = pos;  // degenerate, never expected
@@ -273,7 +287,7 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const st
   for (const Level& L : levels)
     for (int y = 0; y < L.h - sp.wh; y += ystep)
       for (int x = 0; x < L.w - sp.ww; ++x) {
-        if (!negOk(L, x, y)) continue;
+        if (!negOk(L, x, y, sp.features.size() - 1)) continue;
         ++windows;
         pass += cascade_window(cascade, sp, L.mct.data(), L.w, x, y);
       }
@@ -364,12 +378,14 @@ int main(int argc, char** argv) {
   FILE* report = stdout;
   double t0 = now();
   std::vector<LandmarkFace> faces = load_landmarks(data, "new_training.txt");
-  std::fprintf(report, "%zu training faces with checked landmarks\n", faces.size());
+  std::vector<LandmarkFace> held;
+  split_held_out(faces, &held);
+  std::fprintf(report, "%zu training faces with checked landmarks (%zu held out)\n", faces.size(), held.size());
   std::vector<cv::Mat> greys;
   for (const auto& f : faces) greys.push_back(load_grey(f.path));
 
   if (doFace) {
-    Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255, {0.995, 0.995, 0.99, 0.98}};
+    Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255, {0.999, 0.999, 0.998, 0.9995}};
     for (int y = 1; y <= 22; ++y)
       for (int x = 1; x <= 20; ++x) sp.px.push_back(x), sp.py.push_back(y);
     Samples pos;
@@ -399,9 +415,13 @@ int main(int argc, char** argv) {
     // Scenes without faces (every fifth one held out for evaluation), at the
     // working size of the analyser and every pyramid level.
     std::vector<std::string> scenes = list_images(data + "/images_notfaces");
+    const size_t sceneCount = scenes.size();
+    for (const std::string& w : list_images(data + "/wallpapers")) scenes.push_back(w);
+    size_t wallpapers = 0;
     std::vector<Level> levels;
     for (size_t i = 0; i < scenes.size(); ++i) {
-      if (i % 5 == 0) continue;
+      if (is_held_out_scene(i < sceneCount ? i : i - sceneCount)) continue;
+      wallpapers += i >= sceneCount;
       cv::Mat g = load_grey(scenes[i]);
       if (g.empty()) continue;
       add_face_levels(g, levels, nullptr);
@@ -414,9 +434,9 @@ int main(int argc, char** argv) {
       cv::Rect2d fb = face_box_from_eyes(p.lx, p.ly, p.rx, p.ry);
       add_face_levels(greys[i], levels, &fb);
     }
-    std::fprintf(report, "face: %zu positive windows, %zu scene levels (%.0f s)\n", pos.size(), levels.size(),
-                 now() - t0);
-    auto cascade = train_cascade(sp, pos, levels, 1, [](const Level& L, int x, int y) { return face_iou(L, x, y) < 0.25; },
+    std::fprintf(report, "face: %zu positive windows, %zu levels (%zu training wallpapers) (%.0f s)\n", pos.size(),
+                 levels.size(), wallpapers, now() - t0);
+    auto cascade = train_cascade(sp, pos, levels, 1, [](const Level& L, int x, int y, size_t) { return face_iou(L, x, y) < 0.25; },
                                  30000, report);
     write_model(out + "/frontal_model.cpp", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
                 "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
@@ -442,8 +462,8 @@ int main(int argc, char** argv) {
         const cv::Mat& g0 = m ? fl : greys[i];
         Pts p = points(faces[i], m, g0.cols);
         // The analyser's working image, and the face box its detector finds
-        // there (the detected boxes run smaller than the landmark box and
-        // sit higher: where the detector misses, that bias is imitated).
+        // there; where it misses, the landmark box jittered by the spread of
+        // the detected boxes (scale +-10 %, shift +-5 %).
         int gw, gh;
         caIF_WorkingSize(g0.cols, g0.rows, &gw, &gh);
         std::vector<uint8_t> g(gw * gh);
@@ -463,7 +483,7 @@ int main(int argc, char** argv) {
           }
         if (bestIou == 0.3) {
           ++missed;
-          double js = uni(0.8, 0.92), jx = uni(-0.11, -0.02) * fb.width, jy = uni(-0.12, -0.04) * fb.width;
+          double js = uni(0.9, 1.1), jx = uni(-0.05, 0.05) * fb.width, jy = uni(-0.05, 0.05) * fb.width;
           double cx = fb.x + fb.width / 2 + jx, cy = fb.y + fb.height / 2 + jy;
           double bw = fb.width * js, bh = fb.height * js;
           box = SMyRect2{static_cast<int>(cx - bw / 2), static_cast<int>(cy - bh / 2), 0, 0};
@@ -513,11 +533,15 @@ int main(int argc, char** argv) {
     }
     std::fprintf(report, "%s: %zu positive windows, %zu region levels, detector missed %d faces (%.0f s)\n", sp.name,
                  pos.size(), levels.size(), missed, now() - t0);
-    const int tol = 3;
+    // Windows off the target are negatives; the later stages also learn to
+    // reject windows close to it, so that the best hit sits on the target.
+    const int tol[3] = {3, 2, 1};
     auto cascade = train_cascade(
         sp, pos, levels, 1,
-        [tol](const Level& L, int x, int y) { return std::abs(x - L.tx) > tol || std::abs(y - L.ty) > tol; }, 30000,
-        report);
+        [&tol](const Level& L, int x, int y, size_t stage) {
+          return std::abs(x - L.tx) > tol[stage] || std::abs(y - L.ty) > tol[stage];
+        },
+        40000, report);
     if (eye)
       write_model(out + "/eye_model.cpp", sp, cascade, "uint16_t", "m_nEyeMCTFeatureX", "m_nEyeMCTFeatureY", "int32_t",
                   "m_nEDMCTAlpha", "eye windows from MTFL training faces, negatives from the rest of the eye regions");
