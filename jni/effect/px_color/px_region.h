@@ -52,6 +52,27 @@ void px_region_map(const int* in, const unsigned char* mask, int* out, int width
   }
 }
 
+// Copies a whole-picture result into the output by the partial rule: for an
+// empty rectangle every pixel; otherwise the pixels of the rectangle (clipped
+// to the picture) whose mask byte is exactly 1. Other output pixels keep
+// what they held.
+inline void px_merge_selected(const int* result, int* out, const unsigned char* mask, int width, int height,
+                              px_rect rect) {
+  if (width <= 0 || height <= 0) return;
+  if (px_rect_empty(rect)) {
+    std::memcpy(out, result, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    return;
+  }
+  if (!mask) return;
+  const px_rect c = px_rect_clip(rect, width, height);
+  for (int y = c.top; y <= c.bottom; ++y) {
+    const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+    for (int x = c.left; x <= c.right; ++x) {
+      if (mask[row + x] == 1) out[row + x] = result[row + x];
+    }
+  }
+}
+
 // Channel helpers for the pixel functions.
 inline uint32_t px_argb(uint32_t alpha_source, int r, int g, int b) {
   return (alpha_source & 0xFF000000u) | static_cast<uint32_t>(r) << 16 | static_cast<uint32_t>(g) << 8 |

@@ -9,6 +9,7 @@
 #include "../kalo/if_utils_and.h"
 #include "../kalo/px_mem.h"
 #include "../kalo/px_parallel.h"
+#include "../px_color/px_region.h"
 #include "../px_types.h"
 
 namespace px_filter {
@@ -36,18 +37,7 @@ bool partial(const char* func, int* out, const unsigned char* mask, int width, i
   } else {
     whole(scratch);
   }
-  const px_rect r{left, right, top, bottom};
-  if (px_rect_empty(r)) {
-    std::memcpy(out, scratch, n * 4);
-  } else if (mask) {
-    const px_rect c = px_rect_clip(r, width, height);
-    for (int y = c.top; y <= c.bottom; ++y) {
-      const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
-      for (int x = c.left; x <= c.right; ++x) {
-        if (mask[row + x] == 1) out[row + x] = scratch[row + x];
-      }
-    }
-  }
+  px_merge_selected(scratch, out, mask, width, height, px_rect{left, right, top, bottom});
   px_free(scratch);
   return true;
 }

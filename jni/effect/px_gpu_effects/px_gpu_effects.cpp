@@ -9,6 +9,7 @@
 
 #include "../kalo/if_utils_and.h"
 #include "../kalo/px_parallel.h"
+#include "../px_color/px_region.h"
 #include "../px_types.h"
 
 // ---- helpers ---------------------------------------------------------------
@@ -338,20 +339,7 @@ void partial(const char* func, const char* message, unsigned char* mask, int* ou
     if_error_msg(func, __LINE__, "%s", message);
     return;
   }
-  if (whole(scratch)) {
-    const px_rect r{left, right, top, bottom};
-    if (px_rect_empty(r)) {
-      std::memcpy(out, scratch, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
-    } else if (mask) {
-      const px_rect c = px_rect_clip(r, width, height);
-      for (int y = c.top; y <= c.bottom; ++y) {
-        const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
-        for (int x = c.left; x <= c.right; ++x) {
-          if (mask[row + x] == 1) out[row + x] = scratch[row + x];
-        }
-      }
-    }
-  }
+  if (whole(scratch)) px_merge_selected(scratch, out, mask, width, height, px_rect{left, right, top, bottom});
   IF_FREE(scratch);
 }
 

@@ -5,7 +5,6 @@ import static org.junit.jupiter.api.Assertions.assertEquals;
 import static org.junit.jupiter.api.Assertions.assertNotEquals;
 
 import java.util.Arrays;
-import java.util.Random;
 import org.junit.jupiter.api.Nested;
 import org.junit.jupiter.api.Test;
 
@@ -15,18 +14,11 @@ class ColourTest {
     static final int H = 6;
 
     static int[] picture(long seed) {
-        Random r = new Random(seed);
-        int[] p = new int[W * H];
-        for (int i = 0; i < p.length; i++) {
-            p[i] = r.nextInt();
-        }
-        return p;
+        return TestPictures.random(W * H, seed);
     }
 
     static int[] filled(int value) {
-        int[] p = new int[W * H];
-        Arrays.fill(p, value);
-        return p;
+        return TestPictures.filled(W * H, value);
     }
 
     @Nested

@@ -4,7 +4,6 @@ import static org.junit.jupiter.api.Assertions.assertArrayEquals;
 import static org.junit.jupiter.api.Assertions.assertEquals;
 
 import java.util.Arrays;
-import java.util.Random;
 import java.util.concurrent.atomic.AtomicInteger;
 import org.junit.jupiter.api.Nested;
 import org.junit.jupiter.api.Test;
@@ -15,12 +14,7 @@ class EffectsTest {
     static final int H = 18;
 
     static int[] picture(long seed, int n) {
-        Random r = new Random(seed);
-        int[] p = new int[n];
-        for (int i = 0; i < n; i++) {
-            p[i] = r.nextInt();
-        }
-        return p;
+        return TestPictures.random(n, seed);
     }
 
     static int[] picture(long seed) {
