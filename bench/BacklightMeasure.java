@@ -1,5 +1,6 @@
 // Measures the backlight correction on backlit versions of sample photos
-// whose original is known, beside a plain global gamma, and times it.
+// whose original is known, beside a plain global gamma and the automatic
+// adjustment, and times it.
 //
 //   java -Djava.library.path=build -cp build/glimmer.jar bench/BacklightMeasure.java samples-dir [out-dir]
 //
@@ -104,6 +105,9 @@ public class BacklightMeasure {
             row(name, "backlit input", score(orig, lit, lit, w, h));
             int[] g = globalGamma(lit, 0.5);
             row(name, "global gamma 0.5", score(orig, lit, g, w, h));
+            int[] auto = new int[lit.length];
+            Engine.applyAutoAdjust(lit, auto, w, h);
+            row(name, "automatic adjustment", score(orig, lit, auto, w, h));
             int[] out = new int[lit.length];
             Engine.autoBLCInit(lit, w, h);
             for (int strength : new int[] {50, 100}) {
