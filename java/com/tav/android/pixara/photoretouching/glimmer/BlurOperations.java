@@ -50,7 +50,7 @@ final class BlurOperations {
                 }));
         ops.add(new Operation("miniature", "Miniature look: stronger colour and a sharp middle band", false,
                 List.of(), j -> Engine.applyMiniature(j.in, j.out, j.width, j.height)));
-        ops.add(status("outfocus", "Out-focus blur of the whole picture", false,
+        ops.add(status("outfocus-blur", "Out-focus blur of the whole picture", false,
                 List.of(level(0, 7, 0, 3, "radius 3, 7, 15, 31, 41, 49, 55 or 63 pixels")),
                 j -> Engine.applyOutfocusBlur(j.in, j.out, j.width, j.height, j.value("level"))));
         return ops;

@@ -59,7 +59,7 @@ final class PortraitOperations {
                 session("light", "Lighten or darken a round area around every face found",
                         new Param("level", 0, 20, 10, 18, "10 neutral; 3 steps of brightness per level above or below"),
                         Engine::runLightenInPortrait),
-                session("outfocus-portrait", "Blur the background, keeping every face found and its body sharp",
+                session("outfocus", "Blur the background, keeping every face found and its body sharp",
                         new Param("strength", 0, 7, 0, 7, "blur level, 0 none, 7 strongest"),
                         Engine::runOutfocusInPortrait),
                 new Operation("redeye", "Remove the red of a pupil around a touched point", false, List.of(
