@@ -75,7 +75,7 @@ bool Call::check(jbyteArray array, size_t need, const char* what) {
   return check_array(env_, method_, array, need, what);
 }
 
-bool Call::rect(jobject object, px_rect* out) {
+bool Call::raw_rect(jobject object, px_rect* out) {
   if (!object) {
     refuse("rectangle is null");
     return false;
@@ -89,6 +89,13 @@ bool Call::rect(jobject object, px_rect* out) {
     refuse("rectangle has no int fields left, right, top, bottom");
     return false;
   }
+  *out = r;
+  return true;
+}
+
+bool Call::rect(jobject object, px_rect* out) {
+  px_rect r;
+  if (!raw_rect(object, &r)) return false;
   if (!px_rect_empty(r)) {
     const px_rect c = px_rect_clip(r, width_, height_);
     if (px_rect_empty(c)) {

@@ -57,6 +57,10 @@ class Call {
   // (in that order), clipped to the picture. False (logged) for a null
   // object, missing fields, or a non-empty rectangle wholly outside.
   bool rect(jobject object, px_rect* out);
+  // The same fields as they stand, without clipping (a paste position or a
+  // source region may reach outside a picture). False (logged) for a null
+  // object or missing fields.
+  bool raw_rect(jobject object, px_rect* out);
 
   // Pins an array (GetXArrayElements with a null copy flag). Null when it
   // could not be pinned (logged; the pending exception is cleared).

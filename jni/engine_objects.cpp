@@ -64,31 +64,6 @@ ENGINE_METHOD(jint, exitEraser)(JNIEnv*, jobject) { return exit_photoeraser(); }
 // ---- copy and paste --------------------------------------------------------------
 
 namespace {
-// The rectangle's fields as they stand: a paste position or a source region
-// may reach outside a picture (the operation clips per pixel).
-bool raw_rect(bridge::Call& call, jobject object, px_rect* out) {
-  JNIEnv* env = call.env();
-  if (!object) {
-    call.refuse("rectangle is null");
-    return false;
-  }
-  jclass cls = env->GetObjectClass(object);
-  const char* names[4] = {"left", "right", "top", "bottom"};
-  int32_t* fields[4] = {&out->left, &out->right, &out->top, &out->bottom};
-  for (int i = 0; i < 4; ++i) {
-    jfieldID id = env->GetFieldID(cls, names[i], "I");
-    if (!id) {
-      env->ExceptionClear();
-      env->DeleteLocalRef(cls);
-      call.refuse("rectangle has no int fields left, right, top, bottom");
-      return false;
-    }
-    *fields[i] = env->GetIntField(object, id);
-  }
-  env->DeleteLocalRef(cls);
-  return true;
-}
-
 void write_rect(JNIEnv* env, jobject object, const px_rect& r) {
   jclass cls = env->GetObjectClass(object);
   env->SetIntField(object, env->GetFieldID(cls, "left", "I"), r.left);
@@ -145,7 +120,7 @@ ENGINE_METHOD(jint, runCopyPaste)
  jint objHeight, jint width, jint height, jobject rect) {
   bridge::Call call(env, __func__);
   px_rect r;
-  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !raw_rect(call, rect, &r)) {
+  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !call.raw_rect(rect, &r)) {
     return PX_ERR_NULL;
   }
   const size_t n = call.pixels();
@@ -171,7 +146,7 @@ ENGINE_METHOD(jint, pasteObject)
  jint objHeight, jint width, jint height, jobject rect) {
   bridge::Call call(env, __func__);
   px_rect r;
-  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !raw_rect(call, rect, &r)) {
+  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !call.raw_rect(rect, &r)) {
     return PX_ERR_NULL;
   }
   const size_t n = call.pixels();
@@ -195,7 +170,7 @@ ENGINE_METHOD(jint, drawObject)
  jfloat scale, jobject rect) {
   bridge::Call call(env, __func__);
   px_rect r;
-  if (!call.picture(dstWidth, dstHeight) || !second_size(call, srcWidth, srcHeight) || !raw_rect(call, rect, &r)) {
+  if (!call.picture(dstWidth, dstHeight) || !second_size(call, srcWidth, srcHeight) || !call.raw_rect(rect, &r)) {
     return 0;
   }
   const size_t sn = static_cast<size_t>(srcWidth) * static_cast<size_t>(srcHeight);
