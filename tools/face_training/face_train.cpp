@@ -449,7 +449,7 @@ int main(int argc, char** argv) {
   if (doFace) {
     Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255,
             env_list("FACE_KEEP", {0.9995, 0.9995, 0.999, 0.90}), env_num("FACE_EPS", 10),
-            env_num("FACE_LAST_NEG", 3)};
+            env_num("FACE_LAST_NEG", 5)};
     for (int y = 1; y <= 22; ++y)
       for (int x = 1; x <= 20; ++x) sp.px.push_back(x), sp.py.push_back(y);
     // Positive windows: each face aligned by its eyes, mirrored, several
@@ -548,9 +548,9 @@ int main(int argc, char** argv) {
     if (part == 1 && !doMouth) continue;
     const bool eye = part == 0;
     Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX,
-                         env_list("EYE_KEEP", {0.99, 0.99, 0.98}), env_num("EYE_EPS", 10)}
+                         env_list("EYE_KEEP", {0.995, 0.99, 0.97}), env_num("EYE_EPS", 10)}
                   : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX,
-                         env_list("MOUTH_KEEP", {0.99, 0.99, 0.98}), env_num("MOUTH_EPS", 10)};
+                         env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10)};
     for (int y = 1; y <= sp.wh - 2; ++y)
       for (int x = 1; x <= sp.ww - 2; ++x) sp.px.push_back(x), sp.py.push_back(y);
     Samples trainPos, calPos;
@@ -559,7 +559,7 @@ int main(int argc, char** argv) {
     int missed = 0;
     // Positives: the window on the target and (PART_NEIGHBOURS=1) its four neighbours.
     const bool neighbours = env_num(eye ? "EYE_NEIGHBOURS" : "MOUTH_NEIGHBOURS", 0) != 0;
-    const std::vector<double> tolv = env_list(eye ? "EYE_TOL" : "MOUTH_TOL", {3, 2, 1});
+    const std::vector<double> tolv = env_list(eye ? "EYE_TOL" : "MOUTH_TOL", {2, 1, 1});
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
