@@ -7,6 +7,7 @@
 #include <climits>
 #include <cmath>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <functional>
@@ -24,6 +25,23 @@ namespace {
 std::mt19937 rng(20240611);
 double uni(double a, double b) { return std::uniform_real_distribution<double>(a, b)(rng); }
 
+// Training knobs, overridable from the environment for experiments
+// (FACE_KEEP="a,b,c,d", FACE_SCALE="lo,hi", ...); the defaults are the
+// settings of the shipped tables.
+std::vector<double> env_list(const char* name, std::vector<double> def) {
+  const char* v = std::getenv(name);
+  if (!v || !*v) return def;
+  std::vector<double> out;
+  for (const char* p = v; *p;) {
+    char* end;
+    out.push_back(std::strtod(p, &end));
+    if (end == p) break;
+    p = *end == ',' ? end + 1 : end;
+  }
+  return out.size() == def.size() ? out : def;
+}
+double env_num(const char* name, double def) { return env_list(name, {def})[0]; }
+
 double now() {
   return std::chrono::duration<double>(std::chrono::steady_clock::now().time_since_epoch()).count();
 }
@@ -37,6 +55,8 @@ struct Spec {
   std::vector<int> thresholds; // per stage
   int cap;                     // largest table value (255 for bytes)
   std::vector<double> keep;    // share of positive windows each stage keeps
+  double eps = 0.5;            // table smoothing: weight eps / N added to both classes in every bin
+  double lastNegFactor = 1;    // the last stage mines this many times more negatives
 };
 
 struct Stage {
@@ -84,8 +104,16 @@ bool cascade_window(const std::vector<Stage>& c, const Spec& sp, const uint16_t*
 
 // Real AdaBoost over per-position look-up tables; returns the stage in
 // real-valued form (h per code), then quantised so that "sum <= threshold"
-// keeps the wanted share of positives.
-Stage train_stage(const Spec& sp, int stageIndex, const Samples& pos, const Samples& neg) {
+// keeps the wanted share of the calibration positives (windows of faces the
+// boosting never saw: the keep rate measured on the training windows
+// themselves is far too optimistic for a 440-table stage).
+struct RawStage {
+  std::vector<int> chosen;               // position index per feature
+  std::vector<std::vector<double>> hs;   // real-valued table per feature
+};
+Stage quantise(const Spec& sp, int stageIndex, const RawStage& raw, const Samples& cal, double keep);
+
+RawStage train_raw(const Spec& sp, int stageIndex, const Samples& pos, const Samples& neg) {
   const int P = sp.px.size(), n = sp.features[stageIndex];
   const size_t np = pos.size(), nn = neg.size(), N = np + nn;
   // Column-major copy for histogramming.
@@ -96,7 +124,7 @@ Stage train_stage(const Spec& sp, int stageIndex, const Samples& pos, const Samp
     for (int p = 0; p < P; ++p) col[p * N + np + i] = neg.row(i)[p];
   std::vector<double> w(N);
   for (size_t i = 0; i < N; ++i) w[i] = i < np ? 0.5 / np : 0.5 / nn;
-  const double eps = 0.5 / N, clip = 3.0;
+  const double eps = sp.eps / N, clip = 3.0;
   std::vector<int> chosen;
   std::vector<std::vector<double>> hs;
   std::vector<double> Wp(511), Wn(511);
@@ -129,21 +157,28 @@ Stage train_stage(const Spec& sp, int stageIndex, const Samples& pos, const Samp
     chosen.push_back(best);
     hs.push_back(h);
   }
+  return RawStage{chosen, hs};
+}
+
+Stage quantise(const Spec& sp, int stageIndex, const RawStage& raw, const Samples& cal, double keep) {
+  const std::vector<int>& chosen = raw.chosen;
+  const std::vector<std::vector<double>>& hs = raw.hs;
+  const int n = static_cast<int>(chosen.size());
   // Quantise: value = s * (max h - h), so a lower sum is more like the target.
   const int T = sp.thresholds[stageIndex];
   std::vector<double> hmax(n);
   double sumMax = 0;
   for (int f = 0; f < n; ++f) sumMax += hmax[f] = *std::max_element(hs[f].begin(), hs[f].end());
-  std::vector<double> H(np);
-  for (size_t i = 0; i < np; ++i) {
+  const size_t nc = cal.size();
+  std::vector<double> H(nc);
+  for (size_t i = 0; i < nc; ++i) {
     double v = 0;
-    for (int f = 0; f < n; ++f) v += hs[f][pos.row(i)[chosen[f]]];
+    for (int f = 0; f < n; ++f) v += hs[f][cal.row(i)[chosen[f]]];
     H[i] = v;
   }
   std::vector<double> Hs = H;
   std::sort(Hs.begin(), Hs.end());
-  const double keep = sp.keep[stageIndex];
-  const double theta = Hs[static_cast<size_t>((1.0 - keep) * np)];
+  const double theta = Hs[static_cast<size_t>((1.0 - keep) * nc)];
   double s = 0.97 * T / std::max(1e-6, sumMax - theta);
   Stage st;
   for (int attempt = 0; attempt < 40; ++attempt, s *= 0.95) {
@@ -154,10 +189,10 @@ Stage train_stage(const Spec& sp, int stageIndex, const Samples& pos, const Samp
         double v = std::round(s * (hmax[f] - hs[f][k]));
         st.table[f * 511 + k] = static_cast<int32_t>(std::min<double>(v, sp.cap));
       }
-    std::vector<int> S(np);
-    for (size_t i = 0; i < np; ++i) S[i] = stage_sum_row(st, pos.row(i));
+    std::vector<int> S(nc);
+    for (size_t i = 0; i < nc; ++i) S[i] = stage_sum_row(st, cal.row(i));
     std::sort(S.begin(), S.end());
-    const int V = S[std::min(np - 1, static_cast<size_t>(std::ceil(keep * np)) - 1)];
+    const int V = S[std::min(nc - 1, static_cast<size_t>(std::ceil(keep * nc)) - 1)];
     int shift = T - V;
     if (shift < 0) continue;
     for (int f = 0; f < n && shift > 0; ++f) {
@@ -210,11 +245,19 @@ double face_iou(const Level& L, int x, int y) {
   return in / (22.0 * 24.0 + L.fw * L.fh - in);
 }
 
-void add_face_levels(const cv::Mat& g, std::vector<Level>& levels, const cv::Rect2d* face) {
+// The pyramid levels of a photo as the face detector scans them: the
+// analyser's working image, turned by `angle` degrees (with its black
+// corners) for the +-45 degree passes.
+void add_face_levels(const cv::Mat& g, std::vector<Level>& levels, const cv::Rect2d* face, int angle = 0) {
   int ww, wh;
   caIF_WorkingSize(g.cols, g.rows, &ww, &wh);
   std::vector<uint8_t> work(ww * wh);
   Resize_NN(g.data, g.cols, g.rows, work.data(), ww, wh);
+  if (angle) {
+    std::vector<uint8_t> turned(ww * wh);
+    Rotate(work.data(), turned.data(), ww, wh, angle);
+    work.swap(turned);
+  }
   int longer = std::max(ww, wh), r = (std::min(ww, wh) << 15) / longer;
   for (int s : {40, 49, 60, 74, 90, 110, 134, 164, 200, 245, 300, 367, 449, 550}) {
     if (s > longer) break;
@@ -233,11 +276,19 @@ void add_face_levels(const cv::Mat& g, std::vector<Level>& levels, const cv::Rec
   }
 }
 
+// The last stage before quantisation, kept for writing variants with other
+// keep rates.
+struct Sweep {
+  RawStage raw;
+  Samples cal;
+};
+
 // True when a window may serve as a negative for the given stage.
 using LevelScan = std::function<bool(const Level&, int x, int y, size_t stage)>;
 
-std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const std::vector<Level>& levels,
-                                 int ystep, const LevelScan& negOk, size_t negCount, FILE* report) {
+std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const Samples& allCal,
+                                 const std::vector<Level>& levels, int ystep, const LevelScan& negOk, size_t negCount,
+                                 FILE* report, Sweep* sweep = nullptr) {
   std::vector<Stage> cascade;
   for (size_t k = 0; k < sp.features.size(); ++k) {
     double t0 = now();
@@ -245,16 +296,21 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const st
     pos.P = allPos.P;
     for (size_t i = 0; i < allPos.size(); ++i)
       if (cascade_row(cascade, allPos.row(i))) pos.codes.insert(pos.codes.end(), allPos.row(i), allPos.row(i) + allPos.P);
+    Samples cal;
+    cal.P = allCal.P;
+    for (size_t i = 0; i < allCal.size(); ++i)
+      if (cascade_row(cascade, allCal.row(i))) cal.codes.insert(cal.codes.end(), allCal.row(i), allCal.row(i) + allCal.P);
     // Hard negatives: windows that pass the stages so far. When the earlier
     // stages leave too few, the last of them is relaxed step by step, so that
     // the new stage learns from the near misses instead of from nothing.
-    Reservoir res{negCount, {}, 0};
+    const size_t cap = k + 1 == sp.features.size() ? static_cast<size_t>(negCount * sp.lastNegFactor) : negCount;
+    Reservoir res{cap, {}, 0};
     res.s.P = allPos.P;
     size_t windows = 0;
     for (int relax = 0; relax <= 6; ++relax) {
       std::vector<Stage> mining = cascade;
       if (relax && !mining.empty()) mining.back().threshold += mining.back().threshold * relax / 20;
-      res = Reservoir{negCount, {}, 0};
+      res = Reservoir{cap, {}, 0};
       res.s.P = allPos.P;
       windows = 0;
       for (const Level& L : levels)
@@ -264,7 +320,7 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const st
             ++windows;
             if (cascade_window(mining, sp, L.mct.data(), L.w, x, y)) res.offer(sp, L.mct.data(), L.w, x, y);
           }
-      if (res.seen >= negCount / 4 || cascade.empty()) break;
+      if (res.seen >= cap / 4 || cascade.empty()) break;
       std::fprintf(report, "  only %zu negatives pass (last stage relaxed by %d %%); relaxing further\n", res.seen,
                    relax * 5);
     }
@@ -274,13 +330,19 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const st
       std::fprintf(report, "  too few negatives left; stage trained on what there is\n");
       if (res.s.size() == 0) res.s = pos;  // degenerate, never expected
     }
-    cascade.push_back(train_stage(sp, k, pos, res.s));
-    size_t kept = 0;
+    RawStage raw = train_raw(sp, k, pos, res.s);
+    cascade.push_back(quantise(sp, k, raw, cal, sp.keep[k]));
+    if (k + 1 == sp.features.size() && sweep) *sweep = Sweep{raw, cal};
+    size_t kept = 0, calKept = 0;
     for (size_t i = 0; i < allPos.size(); ++i) kept += cascade_row(cascade, allPos.row(i));
+    for (size_t i = 0; i < allCal.size(); ++i) calKept += cascade_row(cascade, allCal.row(i));
     size_t negPass = 0;
     for (size_t i = 0; i < res.s.size(); ++i) negPass += cascade_row(cascade, res.s.row(i));
-    std::fprintf(report, "  trained in %.1f s: keeps %.4f of all positives, passes %.4f of its negatives\n",
-                 now() - t0, double(kept) / allPos.size(), double(negPass) / res.s.size());
+    std::fprintf(report,
+                 "  trained in %.1f s: keeps %.4f of the training and %.4f of the calibration positives, passes %.4f "
+                 "of its negatives\n",
+                 now() - t0, double(kept) / allPos.size(), double(calKept) / allCal.size(),
+                 double(negPass) / res.s.size());
     std::fflush(report);
   }
   size_t windows = 0, pass = 0;
@@ -385,27 +447,40 @@ int main(int argc, char** argv) {
   for (const auto& f : faces) greys.push_back(load_grey(f.path));
 
   if (doFace) {
-    Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255, {0.999, 0.999, 0.998, 0.9995}};
+    Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255,
+            env_list("FACE_KEEP", {0.9995, 0.9995, 0.999, 0.90}), env_num("FACE_EPS", 10),
+            env_num("FACE_LAST_NEG", 5)};
     for (int y = 1; y <= 22; ++y)
       for (int x = 1; x <= 20; ++x) sp.px.push_back(x), sp.py.push_back(y);
-    Samples pos;
-    pos.P = sp.px.size();
+    // Positive windows: each face aligned by its eyes, mirrored, several
+    // copies with random scale (about one pyramid step), roll and shift.
+    const std::vector<double> scaleRange = env_list("FACE_SCALE", {0.87, 1.15});
+    const double shift = env_num("FACE_SHIFT", 1.5), rollRange = env_num("FACE_ROLL", 0.17);
+    const int copies = static_cast<int>(env_num("FACE_COPIES", 2));
+    std::fprintf(report, "face: keep %g %g %g %g, eps %g, scale %g..%g, shift %g, roll %g, %d copies\n", sp.keep[0],
+                 sp.keep[1], sp.keep[2], sp.keep[3], sp.eps, scaleRange[0], scaleRange[1], shift, rollRange, copies);
+    Samples trainPos, calPos;
+    trainPos.P = calPos.P = sp.px.size();
     std::vector<uint8_t> win;
     std::vector<uint16_t> mct(22 * 24);
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
+      // Every eighth face calibrates the stage thresholds only.
+      Samples& pos = i % 8 == 5 ? calPos : trainPos;
       for (int m = 0; m < 2; ++m) {
         const cv::Mat& g = m ? fl : greys[i];
         Pts p = points(faces[i], m, g.cols);
         double d = std::hypot(p.rx - p.lx, p.ry - p.ly);
         if (d < 6) continue;
         double a = std::atan2(p.ry - p.ly, p.rx - p.lx);
-        for (int j = 0; j < 2; ++j) {
-          double scale = uni(0.91, 1.1), roll = uni(-0.17, 0.17);
+        for (int j = 0; j < copies; ++j) {
+          // Log-uniform scale: the pyramid steps are geometric.
+          double scale = std::exp(uni(std::log(scaleRange[0]), std::log(scaleRange[1])));
+          double roll = uni(-rollRange, rollRange);
           double s = d / kEyeDist * scale;
-          sample_window(g, (p.lx + p.rx) / 2, (p.ly + p.ry) / 2, a + roll, s, kEyeMidX + uni(-1, 1),
-                        kEyeMidY + uni(-1, 1), 22, 24, win);
+          sample_window(g, (p.lx + p.rx) / 2, (p.ly + p.ry) / 2, a + roll, s, kEyeMidX + uni(-shift, shift),
+                        kEyeMidY + uni(-shift, shift), 22, 24, win);
           std::fill(mct.begin(), mct.end(), 0);
           image2MCT_FD(win.data(), 22, 24, mct.data());
           add_window(pos, sp, mct.data(), 22, 0, 0);
@@ -419,13 +494,22 @@ int main(int argc, char** argv) {
     for (const std::string& w : list_images(data + "/wallpapers")) scenes.push_back(w);
     size_t wallpapers = 0;
     std::vector<Level> levels;
-    for (size_t i = 0; i < scenes.size(); ++i) {
+    // Share of the training wallpapers used (FACE_WALLPAPERS, tenths).
+    // The scenes turned by +-45 degrees, as the turned passes see them (FACE_TURNED=0: upright only).
+    const bool turnedNegatives = env_num("FACE_TURNED", 1) != 0;
+    const int wallTenths = static_cast<int>(std::lround(10 * env_num("FACE_WALLPAPERS", 1.0)));
+    for (size_t i = 0, w = 0; i < scenes.size(); ++i) {
       if (is_held_out_scene(i < sceneCount ? i : i - sceneCount)) continue;
+      if (i >= sceneCount && static_cast<int>(w++ % 10) >= wallTenths) continue;
       wallpapers += i >= sceneCount;
       cv::Mat g = load_grey(scenes[i]);
       if (g.empty()) continue;
       add_face_levels(g, levels, nullptr);
       add_face_levels(flip(g), levels, nullptr);
+      if (turnedNegatives) {
+        add_face_levels(g, levels, nullptr, 45);
+        add_face_levels(g, levels, nullptr, -45);
+      }
     }
     // The surroundings of faces in landmark photos: windows off the face.
     for (size_t i = 0; i < faces.size(); i += 12) {
@@ -434,10 +518,26 @@ int main(int argc, char** argv) {
       cv::Rect2d fb = face_box_from_eyes(p.lx, p.ly, p.rx, p.ry);
       add_face_levels(greys[i], levels, &fb);
     }
-    std::fprintf(report, "face: %zu positive windows, %zu levels (%zu training wallpapers) (%.0f s)\n", pos.size(),
-                 levels.size(), wallpapers, now() - t0);
-    auto cascade = train_cascade(sp, pos, levels, 1, [](const Level& L, int x, int y, size_t) { return face_iou(L, x, y) < 0.25; },
-                                 30000, report);
+    std::fprintf(report, "face: %zu + %zu calibration positive windows, %zu levels (%zu training wallpapers) (%.0f s)\n",
+                 trainPos.size(), calPos.size(), levels.size(), wallpapers, now() - t0);
+    Sweep sweep;
+    auto cascade = train_cascade(sp, trainPos, calPos, levels, 1, [](const Level& L, int x, int y, size_t) { return face_iou(L, x, y) < 0.25; },
+                                 30000, report, &sweep);
+    // Variants with other keep rates of the last stage (FACE_SWEEP="0.98,0.95"),
+    // written beside the model as frontal_model.cpp.<keep>.
+    if (const char* sw = std::getenv("FACE_SWEEP"))
+      for (const char* p = sw; *p;) {
+        char* end;
+        double keep = std::strtod(p, &end);
+        if (end == p) break;
+        p = *end == ',' ? end + 1 : end;
+        std::vector<Stage> variant = cascade;
+        variant.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, keep);
+        char name[64];
+        std::snprintf(name, sizeof name, "/frontal_model.cpp.%.4f", keep);
+        write_model(out + name, sp, variant, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0", "uint8_t",
+                    "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
+      }
     write_model(out + "/frontal_model.cpp", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
                 "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
   }
@@ -447,17 +547,23 @@ int main(int argc, char** argv) {
     if (part == 0 && !doEye) continue;
     if (part == 1 && !doMouth) continue;
     const bool eye = part == 0;
-    Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX, {0.99, 0.99, 0.98}}
-                  : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX, {0.99, 0.99, 0.98}};
+    Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX,
+                         env_list("EYE_KEEP", {0.995, 0.99, 0.97}), env_num("EYE_EPS", 10)}
+                  : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX,
+                         env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10)};
     for (int y = 1; y <= sp.wh - 2; ++y)
       for (int x = 1; x <= sp.ww - 2; ++x) sp.px.push_back(x), sp.py.push_back(y);
-    Samples pos;
-    pos.P = sp.px.size();
+    Samples trainPos, calPos;
+    trainPos.P = calPos.P = sp.px.size();
     std::vector<Level> levels;
     int missed = 0;
+    // Positives: the window on the target and (PART_NEIGHBOURS=1) its four neighbours.
+    const bool neighbours = env_num(eye ? "EYE_NEIGHBOURS" : "MOUTH_NEIGHBOURS", 0) != 0;
+    const std::vector<double> tolv = env_list(eye ? "EYE_TOL" : "MOUTH_TOL", {2, 1, 1});
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
+      Samples& pos = i % 8 == 5 ? calPos : trainPos;  // every eighth face calibrates the thresholds
       for (int m = 0; m < 2; ++m) {
         const cv::Mat& g0 = m ? fl : greys[i];
         Pts p = points(faces[i], m, g0.cols);
@@ -522,7 +628,7 @@ int main(int argc, char** argv) {
             L.ty = static_cast<int>(std::lround(ty * k2 - sp.wh / 2.0));
             for (int dy = -1; dy <= 1; ++dy)
               for (int dx = -1; dx <= 1; ++dx) {
-                if (dx && dy) continue;
+                if ((dx && dy) || ((dx || dy) && !neighbours)) continue;
                 int x = L.tx + dx, y = L.ty + dy;
                 if (x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh) add_window(pos, sp, L.mct.data(), lw, x, y);
               }
@@ -531,13 +637,15 @@ int main(int argc, char** argv) {
         }
       }
     }
-    std::fprintf(report, "%s: %zu positive windows, %zu region levels, detector missed %d faces (%.0f s)\n", sp.name,
-                 pos.size(), levels.size(), missed, now() - t0);
+    std::fprintf(report, "%s: %zu + %zu calibration positive windows, %zu region levels, detector missed %d faces (%.0f s)\n",
+                 sp.name, trainPos.size(), calPos.size(), levels.size(), missed, now() - t0);
     // Windows off the target are negatives; the later stages also learn to
     // reject windows close to it, so that the best hit sits on the target.
-    const int tol[3] = {3, 2, 1};
+    const int tol[3] = {static_cast<int>(tolv[0]), static_cast<int>(tolv[1]), static_cast<int>(tolv[2])};
+    std::fprintf(report, "%s: keep %g %g %g, eps %g, neighbours %d, tolerance %d %d %d\n", sp.name, sp.keep[0],
+                 sp.keep[1], sp.keep[2], sp.eps, neighbours, tol[0], tol[1], tol[2]);
     auto cascade = train_cascade(
-        sp, pos, levels, 1,
+        sp, trainPos, calPos, levels, 1,
         [&tol](const Level& L, int x, int y, size_t stage) {
           return std::abs(x - L.tx) > tol[stage] || std::abs(y - L.ty) > tol[stage];
         },
