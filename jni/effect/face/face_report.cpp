@@ -15,8 +15,22 @@ int px_analyze_faces(const int* argb, int width, int height, int mode, int maxFa
     int* r = report + i * PX_FACE_REPORT_INTS;
     const caFaceBox& f = info.faceRect[i];
     const caEyePair& e = info.eyePoints[i];
-    const int values[PX_FACE_REPORT_INTS] = {f.x,  f.y,  f.width, f.height, info.eyeValid[i] ? 1 : 0, e.x1,
-                                             e.y1, e.x2, e.y2,    info.mouthCenter[i].x, info.mouthCenter[i].y};
+    // The analyser marks every face's eyes valid and sets the points to -1
+    // when the eye search fails; the mouth is searched only for a face with
+    // eyes and no roll, and is -1 when not found.
+    const bool eyes = info.eyeValid[i] && e.x1 >= 0;
+    const bool mouth = eyes && info.faceRotated[i] == 0 && info.mouthCenter[i].x >= 0;
+    const int values[PX_FACE_REPORT_INTS] = {f.x,
+                                             f.y,
+                                             f.width,
+                                             f.height,
+                                             eyes ? 1 : 0,
+                                             eyes ? e.x1 : -1,
+                                             eyes ? e.y1 : -1,
+                                             eyes ? e.x2 : -1,
+                                             eyes ? e.y2 : -1,
+                                             mouth ? info.mouthCenter[i].x : -1,
+                                             mouth ? info.mouthCenter[i].y : -1};
     for (int k = 0; k < PX_FACE_REPORT_INTS; ++k) r[k] = values[k];
   }
   ReleaseFaceBeautyPlus(&info);
