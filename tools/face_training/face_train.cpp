@@ -1,7 +1,7 @@
 // Trains the face, eye and mouth cascades: boosted 511-entry look-up tables
 // over census codes, cut from the pictures exactly as the detectors see them
 // at run time, with hard negatives mined by the stages trained so far.
-// Writes jni/effect/face/models/*.cpp. Usage: face_train DATA_DIR OUT_DIR
+// Writes jni/effect/face/models/*_model.inc (data compiled in by face_models.cpp). Usage: face_train DATA_DIR OUT_DIR
 #include <algorithm>
 #include <chrono>
 #include <climits>
@@ -524,7 +524,7 @@ int main(int argc, char** argv) {
     auto cascade = train_cascade(sp, trainPos, calPos, levels, 1, [](const Level& L, int x, int y, size_t) { return face_iou(L, x, y) < 0.25; },
                                  30000, report, &sweep);
     // Variants with other keep rates of the last stage (FACE_SWEEP="0.98,0.95"),
-    // written beside the model as frontal_model.cpp.<keep>.
+    // written beside the model as frontal_model.inc.<keep>.
     if (const char* sw = std::getenv("FACE_SWEEP"))
       for (const char* p = sw; *p;) {
         char* end;
@@ -534,11 +534,11 @@ int main(int argc, char** argv) {
         std::vector<Stage> variant = cascade;
         variant.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, keep);
         char name[64];
-        std::snprintf(name, sizeof name, "/frontal_model.cpp.%.4f", keep);
+        std::snprintf(name, sizeof name, "/frontal_model.inc.%.4f", keep);
         write_model(out + name, sp, variant, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0", "uint8_t",
                     "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
       }
-    write_model(out + "/frontal_model.cpp", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
+    write_model(out + "/frontal_model.inc", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
                 "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
   }
 
@@ -651,10 +651,10 @@ int main(int argc, char** argv) {
         },
         40000, report);
     if (eye)
-      write_model(out + "/eye_model.cpp", sp, cascade, "uint16_t", "m_nEyeMCTFeatureX", "m_nEyeMCTFeatureY", "int32_t",
+      write_model(out + "/eye_model.inc", sp, cascade, "uint16_t", "m_nEyeMCTFeatureX", "m_nEyeMCTFeatureY", "int32_t",
                   "m_nEDMCTAlpha", "eye windows from MTFL training faces, negatives from the rest of the eye regions");
     else
-      write_model(out + "/mouth_model.cpp", sp, cascade, "uint16_t", "m_nMouthMCTFeatureX", "m_nMouthMCTFeatureY",
+      write_model(out + "/mouth_model.inc", sp, cascade, "uint16_t", "m_nMouthMCTFeatureX", "m_nMouthMCTFeatureY",
                   "int32_t", "m_nMDMCTAlpha",
                   "mouth windows from MTFL training faces, negatives from the rest of the mouth regions");
   }
