@@ -258,7 +258,7 @@ void landmark_eval(const char* title, const std::vector<LandmarkFace>& test) {
   std::printf("\n%s: %d; face found %d (%.3f)\n", title, n, faceFound, double(faceFound) / std::max(1, n));
   std::printf("detected box against the landmark box: width ratio %.3f, centre offset (%.3f, %.3f) widths\n",
               boxScale / std::max(1, faceFound), boxDx / std::max(1, faceFound), boxDy / std::max(1, faceFound));
-  std::printf("eyes found in %d of the found faces (%.3f); worse eye error: mean %.3f of the eye distance, "
+  std::printf("eyes found in %d of the found faces (%.3f); worse eye error: mean %.4f of the eye distance, "
               "%d (%.3f) within 0.10\n",
               eyesFound, double(eyesFound) / std::max(1, faceFound), eyeErr / std::max(1, eyesFound), eyesWithin,
               double(eyesWithin) / std::max(1, eyesFound));
@@ -269,7 +269,7 @@ void landmark_eval(const char* title, const std::vector<LandmarkFace>& test) {
               "second %.3f\n",
               sd[0] / std::max(1, eyesFound), sd[1] / std::max(1, eyesFound), sd[2] / std::max(1, eyesFound),
               sd[3] / std::max(1, eyesFound), e1 / std::max(1, eyesFound), e2 / std::max(1, eyesFound));
-  std::printf("mouth found in %d faces with eyes; centre error mean %.3f of the eye distance, %d (%.3f) within 0.20\n",
+  std::printf("mouth found in %d faces with eyes; centre error mean %.4f of the eye distance, %d (%.3f) within 0.20\n",
               mouthFound, mouthErr / std::max(1, mouthFound), mouthWithin, double(mouthWithin) / std::max(1, mouthFound));
 }
 }  // namespace

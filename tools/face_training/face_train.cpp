@@ -548,7 +548,7 @@ int main(int argc, char** argv) {
     if (part == 1 && !doMouth) continue;
     const bool eye = part == 0;
     Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX,
-                         env_list("EYE_KEEP", {0.995, 0.99, 0.97}), env_num("EYE_EPS", 10)}
+                         env_list("EYE_KEEP", {0.995, 0.99, 0.98}), env_num("EYE_EPS", 10)}
                   : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX,
                          env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10)};
     for (int y = 1; y <= sp.wh - 2; ++y)
@@ -559,7 +559,10 @@ int main(int argc, char** argv) {
     int missed = 0;
     // Positives: the window on the target and (PART_NEIGHBOURS=1) its four neighbours.
     const bool neighbours = env_num(eye ? "EYE_NEIGHBOURS" : "MOUTH_NEIGHBOURS", 0) != 0;
-    const std::vector<double> tolv = env_list(eye ? "EYE_TOL" : "MOUTH_TOL", {2, 1, 1});
+    const std::vector<double> tolv = eye ? env_list("EYE_TOL", {3, 2, 1}) : env_list("MOUTH_TOL", {2, 1, 1});
+    // Faces whose regions give negatives (every Nth), and the negatives mined per stage.
+    const size_t negEvery = static_cast<size_t>(std::max(1.0, eye ? env_num("EYE_NEG_EVERY", 1) : env_num("MOUTH_NEG_EVERY", 2)));
+    const size_t negCount = static_cast<size_t>(eye ? env_num("EYE_NEGS", 100000) : env_num("MOUTH_NEGS", 40000));
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
@@ -632,7 +635,7 @@ int main(int argc, char** argv) {
                 int x = L.tx + dx, y = L.ty + dy;
                 if (x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh) add_window(pos, sp, L.mct.data(), lw, x, y);
               }
-            if (i % 2 == 0) levels.push_back(std::move(L));  // half the faces serve as negative sources
+            if (i % negEvery == 0) levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
           }
         }
       }
@@ -642,14 +645,14 @@ int main(int argc, char** argv) {
     // Windows off the target are negatives; the later stages also learn to
     // reject windows close to it, so that the best hit sits on the target.
     const int tol[3] = {static_cast<int>(tolv[0]), static_cast<int>(tolv[1]), static_cast<int>(tolv[2])};
-    std::fprintf(report, "%s: keep %g %g %g, eps %g, neighbours %d, tolerance %d %d %d\n", sp.name, sp.keep[0],
-                 sp.keep[1], sp.keep[2], sp.eps, neighbours, tol[0], tol[1], tol[2]);
+    std::fprintf(report, "%s: keep %g %g %g, eps %g, neighbours %d, tolerance %d %d %d, negatives from every %zu. face, %zu per stage\n",
+                 sp.name, sp.keep[0], sp.keep[1], sp.keep[2], sp.eps, neighbours, tol[0], tol[1], tol[2], negEvery, negCount);
     auto cascade = train_cascade(
         sp, trainPos, calPos, levels, 1,
         [&tol](const Level& L, int x, int y, size_t stage) {
           return std::abs(x - L.tx) > tol[stage] || std::abs(y - L.ty) > tol[stage];
         },
-        40000, report);
+        negCount, report);
     if (eye)
       write_model(out + "/eye_model.inc", sp, cascade, "uint16_t", "m_nEyeMCTFeatureX", "m_nEyeMCTFeatureY", "int32_t",
                   "m_nEDMCTAlpha", "eye windows from MTFL training faces, negatives from the rest of the eye regions");
