@@ -115,12 +115,20 @@ ENGINE_METHOD(jint, runCopyObject)
   return PX_OK;
 }
 
-ENGINE_METHOD(jint, runCopyPaste)
-(JNIEnv* env, jobject, jintArray object, jintArray picture, jbyteArray mask, jintArray out, jint objWidth,
- jint objHeight, jint width, jint height, jobject rect) {
-  bridge::Call call(env, __func__);
-  px_rect r;
-  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !call.raw_rect(rect, &r)) {
+namespace {
+// The arrays of a paste: the object and its mask (object size), the picture
+// pasted onto and the output (picture size); the rectangle as it stands.
+struct Paste {
+  int* object;
+  unsigned char* mask;
+  int* picture;
+  int* out;
+  px_rect rect;
+};
+
+jint pin_paste(bridge::Call& call, jintArray object, jintArray picture, jbyteArray mask, jintArray out, jint objWidth,
+               jint objHeight, jint width, jint height, jobject rect, Paste* p) {
+  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !call.raw_rect(rect, &p->rect)) {
     return PX_ERR_NULL;
   }
   const size_t n = call.pixels();
@@ -129,15 +137,26 @@ ENGINE_METHOD(jint, runCopyPaste)
       !call.check(out, n, "out")) {
     return PX_ERR_NULL;
   }
-  jint* o = call.pin(object, 0, bridge::kReads);
-  jbyte* m = call.pin(mask, JNI_ABORT, bridge::kReads);
-  jint* p = call.pin(picture, 0, bridge::kReads);
-  jint* d = call.pin(out, 0, bridge::kWrites);
-  if (!o || !m || !p || !d) return PX_ERR_ALLOC;
-  const auto* mk = reinterpret_cast<unsigned char*>(m);
+  p->object = call.pin(object, 0, bridge::kReads);
+  p->mask = reinterpret_cast<unsigned char*>(call.pin(mask, JNI_ABORT, bridge::kReads));
+  p->picture = call.pin(picture, 0, bridge::kReads);
+  p->out = call.pin(out, 0, bridge::kWrites);
+  return p->object && p->mask && p->picture && p->out ? PX_OK : PX_ERR_ALLOC;
+}
+}  // namespace
+
+ENGINE_METHOD(jint, runCopyPaste)
+(JNIEnv* env, jobject, jintArray object, jintArray picture, jbyteArray mask, jintArray out, jint objWidth,
+ jint objHeight, jint width, jint height, jobject rect) {
+  bridge::Call call(env, __func__);
+  Paste p;
+  if (jint rc = pin_paste(call, object, picture, mask, out, objWidth, objHeight, width, height, rect, &p); rc != PX_OK) {
+    return rc;
+  }
   int mr, mg, mb;
-  px_object_means(o, mk, objWidth, objHeight, &mr, &mg, &mb);
-  px_copy_paste_fixed(o, p, mk, d, objWidth, objHeight, width, height, r.left, r.right, r.top, r.bottom, mr, mg, mb);
+  px_object_means(p.object, p.mask, objWidth, objHeight, &mr, &mg, &mb);
+  px_copy_paste_fixed(p.object, p.picture, p.mask, p.out, objWidth, objHeight, width, height, p.rect.left,
+                      p.rect.right, p.rect.top, p.rect.bottom, mr, mg, mb);
   return PX_OK;
 }
 
@@ -145,23 +164,13 @@ ENGINE_METHOD(jint, pasteObject)
 (JNIEnv* env, jobject, jintArray object, jintArray background, jbyteArray mask, jintArray out, jint objWidth,
  jint objHeight, jint width, jint height, jobject rect) {
   bridge::Call call(env, __func__);
-  px_rect r;
-  if (!call.picture(width, height) || !second_size(call, objWidth, objHeight) || !call.raw_rect(rect, &r)) {
-    return PX_ERR_NULL;
+  Paste p;
+  if (jint rc = pin_paste(call, object, background, mask, out, objWidth, objHeight, width, height, rect, &p);
+      rc != PX_OK) {
+    return rc;
   }
-  const size_t n = call.pixels();
-  const size_t on = static_cast<size_t>(objWidth) * static_cast<size_t>(objHeight);
-  if (!call.check(object, on, "object") || !call.check(mask, on, "mask") ||
-      !call.check(background, n, "background") || !call.check(out, n, "out")) {
-    return PX_ERR_NULL;
-  }
-  jint* o = call.pin(object, 0, bridge::kReads);
-  jbyte* m = call.pin(mask, JNI_ABORT, bridge::kReads);
-  jint* b = call.pin(background, 0, bridge::kReads);
-  jint* d = call.pin(out, 0, bridge::kWrites);
-  if (!o || !m || !b || !d) return PX_ERR_ALLOC;
-  px_paste_object(o, b, reinterpret_cast<unsigned char*>(m), d, objWidth, objHeight, width, height, r.left, r.right,
-                  r.top);
+  px_paste_object(p.object, p.picture, p.mask, p.out, objWidth, objHeight, width, height, p.rect.left, p.rect.right,
+                  p.rect.top);
   return PX_OK;
 }
 
