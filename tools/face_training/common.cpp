@@ -4,12 +4,33 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
+#include <cstdlib>
 #include <fstream>
 #include <map>
 #include <opencv2/imgcodecs.hpp>
 #include <sstream>
 
-std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list) {
+namespace {
+std::vector<LandmarkFace> read_rows(const std::string& file, const std::map<std::string, bool>& good) {
+  std::vector<LandmarkFace> out;
+  std::ifstream in(file);
+  std::string line;
+  while (std::getline(in, line)) {
+    std::istringstream ss(line);
+    LandmarkFace f;
+    ss >> f.path;
+    for (float& v : f.x) ss >> v;
+    for (float& v : f.y) ss >> v;
+    auto g = good.find(f.path);
+    if (!ss || g == good.end() || !g->second) continue;
+    out.push_back(f);
+  }
+  return out;
+}
+}  // namespace
+
+std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list, const std::string& labels) {
   std::map<std::string, bool> good;
   std::ifstream tc(root + "/teacher_check.tsv");
   std::string line;
@@ -22,19 +43,23 @@ std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::str
     std::getline(ss, b, '\t');
     good[p] = b == "1";
   }
-  std::vector<LandmarkFace> out;
-  std::ifstream in(root + "/" + list);
-  while (std::getline(in, line)) {
-    std::istringstream ss(line);
-    LandmarkFace f;
-    ss >> f.path;
-    for (float& v : f.x) ss >> v;
-    for (float& v : f.y) ss >> v;
-    if (!ss || !good[f.path]) continue;
+  std::vector<LandmarkFace> out = read_rows(root + "/" + list + (labels == "dlib" ? "_dlib" : "") + ".txt", good);
+  if (labels == "mean") {
+    std::vector<LandmarkFace> other = read_rows(root + "/" + list + "_dlib.txt", good);
+    if (other.size() != out.size()) {
+      std::fprintf(stderr, "%s_dlib.txt does not match %s.txt (run face_relabel)\n", list.c_str(), list.c_str());
+      std::exit(2);
+    }
+    for (size_t i = 0; i < out.size(); ++i)
+      for (int j = 0; j < 5; ++j) out[i].x[j] = (out[i].x[j] + other[i].x[j]) / 2, out[i].y[j] = (out[i].y[j] + other[i].y[j]) / 2;
+  } else if (!labels.empty() && out.empty()) {
+    std::fprintf(stderr, "no %s_%s.txt (run face_relabel)\n", list.c_str(), labels.c_str());
+    std::exit(2);
+  }
+  for (LandmarkFace& f : out) {
     for (char& c : f.path)
       if (c == '\\') c = '/';
     f.path = root + "/" + f.path;
-    out.push_back(f);
   }
   return out;
 }

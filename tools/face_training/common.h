@@ -11,8 +11,11 @@ struct LandmarkFace {
   float x[5], y[5];  // left eye, right eye, nose, left mouth corner, right mouth corner
 };
 
-// Rows of an MTFL list whose landmarks were confirmed by the teacher check.
-std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list);
+// Rows of an MTFL list ("new_training") whose landmarks were confirmed by the
+// teacher check. labels: "" the MTFL annotation; "dlib" the points that
+// face_relabel wrote (LIST_dlib.txt); "mean" the average of the two.
+std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::string& list,
+                                         const std::string& labels = "");
 // Grey (R + G + B) / 3 image, as the engine sees it.
 cv::Mat load_grey(const std::string& path);
 std::vector<std::string> list_images(const std::string& dir);

@@ -57,6 +57,11 @@ struct Spec {
   std::vector<double> keep;    // share of positive windows each stage keeps
   double eps = 0.5;            // table smoothing: weight eps / N added to both classes in every bin
   double lastNegFactor = 1;    // the last stage mines this many times more negatives
+  // Signed tables (eyes, mouth): the scale of the last stage's values. Its sum
+  // is also the hits' confidence, sum * 256 / 17408 in whole numbers, so a
+  // larger scale ranks neighbouring windows more finely; 0 keeps the byte-like
+  // scale of the other stages.
+  double lastScale = 0;
 };
 
 struct Stage {
@@ -160,6 +165,35 @@ RawStage train_raw(const Spec& sp, int stageIndex, const Samples& pos, const Sam
   return RawStage{chosen, hs};
 }
 
+// Signed last stage at a fine scale: values s * (max h - h) with s chosen so
+// that every possible sum stays within +-2^31 / 256 (the confidence is
+// computed as sum * 256 in 32 bits), then the whole stage shifted (values may
+// go negative) so that "sum <= T" keeps the wanted share of the calibration
+// windows.
+Stage quantise_fine(const Spec& sp, const RawStage& raw, const Samples& cal, double keep, int T,
+                    const std::vector<double>& hmax) {
+  const int n = static_cast<int>(raw.chosen.size());
+  double span = 0;  // largest possible sum of s = 1
+  for (int f = 0; f < n; ++f) span += hmax[f] - *std::min_element(raw.hs[f].begin(), raw.hs[f].end());
+  const double limit = (2147483647.0 / 256) * 0.45;  // room for the shift on either side
+  const double s = std::min(sp.lastScale, limit / std::max(1e-6, span));
+  Stage st;
+  st.pos = raw.chosen;
+  st.table.assign(static_cast<size_t>(n) * 511, 0);
+  for (int f = 0; f < n; ++f)
+    for (int k = 0; k < 511; ++k) st.table[f * 511 + k] = static_cast<int32_t>(std::lround(s * (hmax[f] - raw.hs[f][k])));
+  const size_t nc = cal.size();
+  std::vector<int> S(nc);
+  for (size_t i = 0; i < nc; ++i) S[i] = stage_sum_row(st, cal.row(i));
+  std::sort(S.begin(), S.end());
+  const int V = S[std::min(nc - 1, static_cast<size_t>(std::ceil(keep * nc)) - 1)];
+  const int shift = T - V;  // may be negative: the values are signed
+  for (int k = 0; k < 511; ++k) st.table[k] += shift;  // on the first feature: every sum moves by the shift
+  st.threshold = T;
+  std::fprintf(stderr, "%s last stage: scale %.1f, shift %d\n", sp.name, s, shift);
+  return st;
+}
+
 Stage quantise(const Spec& sp, int stageIndex, const RawStage& raw, const Samples& cal, double keep) {
   const std::vector<int>& chosen = raw.chosen;
   const std::vector<std::vector<double>>& hs = raw.hs;
@@ -179,6 +213,8 @@ Stage quantise(const Spec& sp, int stageIndex, const RawStage& raw, const Sample
   std::vector<double> Hs = H;
   std::sort(Hs.begin(), Hs.end());
   const double theta = Hs[static_cast<size_t>((1.0 - keep) * nc)];
+  if (sp.lastScale > 0 && stageIndex + 1 == static_cast<int>(sp.features.size()))
+    return quantise_fine(sp, raw, cal, keep, T, hmax);
   double s = 0.97 * T / std::max(1e-6, sumMax - theta);
   Stage st;
   for (int attempt = 0; attempt < 40; ++attempt, s *= 0.95) {
@@ -283,8 +319,9 @@ struct Sweep {
   Samples cal;
 };
 
-// True when a window may serve as a negative for the given stage.
-using LevelScan = std::function<bool(const Level&, int x, int y, size_t stage)>;
+// How many times a window is offered as a negative for the given stage (0:
+// it is no negative; more than 1 weighs it up in the sample).
+using LevelScan = std::function<int(const Level&, int x, int y, size_t stage)>;
 
 std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const Samples& allCal,
                                  const std::vector<Level>& levels, int ystep, const LevelScan& negOk, size_t negCount,
@@ -316,9 +353,11 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const Sa
       for (const Level& L : levels)
         for (int y = 0; y < L.h - sp.wh; y += ystep)
           for (int x = 0; x < L.w - sp.ww; ++x) {
-            if (!negOk(L, x, y, k)) continue;
+            const int copies = negOk(L, x, y, k);
+            if (!copies) continue;
             ++windows;
-            if (cascade_window(mining, sp, L.mct.data(), L.w, x, y)) res.offer(sp, L.mct.data(), L.w, x, y);
+            if (cascade_window(mining, sp, L.mct.data(), L.w, x, y))
+              for (int c = 0; c < copies; ++c) res.offer(sp, L.mct.data(), L.w, x, y);
           }
       if (res.seen >= cap / 4 || cascade.empty()) break;
       std::fprintf(report, "  only %zu negatives pass (last stage relaxed by %d %%); relaxing further\n", res.seen,
@@ -439,7 +478,7 @@ int main(int argc, char** argv) {
   }
   FILE* report = stdout;
   double t0 = now();
-  std::vector<LandmarkFace> faces = load_landmarks(data, "new_training.txt");
+  std::vector<LandmarkFace> faces = load_landmarks(data, "new_training", std::getenv("FACE_LABELS") ? std::getenv("FACE_LABELS") : "");
   std::vector<LandmarkFace> held;
   split_held_out(faces, &held);
   std::fprintf(report, "%zu training faces with checked landmarks (%zu held out)\n", faces.size(), held.size());
@@ -548,9 +587,11 @@ int main(int argc, char** argv) {
     if (part == 1 && !doMouth) continue;
     const bool eye = part == 0;
     Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX,
-                         env_list("EYE_KEEP", {0.995, 0.99, 0.98}), env_num("EYE_EPS", 10)}
+                         env_list("EYE_KEEP", {0.995, 0.99, 0.98}), env_num("EYE_EPS", 10), 1,
+                         env_num("EYE_SCALE", 6000)}
                   : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX,
-                         env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10)};
+                         env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10), 1,
+                         env_num("MOUTH_SCALE", 0)};
     for (int y = 1; y <= sp.wh - 2; ++y)
       for (int x = 1; x <= sp.ww - 2; ++x) sp.px.push_back(x), sp.py.push_back(y);
     Samples trainPos, calPos;
@@ -559,6 +600,8 @@ int main(int argc, char** argv) {
     int missed = 0;
     // Positives: the window on the target and (PART_NEIGHBOURS=1) its four neighbours.
     const bool neighbours = env_num(eye ? "EYE_NEIGHBOURS" : "MOUTH_NEIGHBOURS", 0) != 0;
+    // Levels (33, 30, 27, 24 wide) whose target windows are positives.
+    const std::vector<double> posLevels = env_list(eye ? "EYE_POS_LEVELS" : "MOUTH_POS_LEVELS", {1, 1, 1, 1});
     const std::vector<double> tolv = eye ? env_list("EYE_TOL", {3, 2, 1}) : env_list("MOUTH_TOL", {2, 1, 1});
     // Faces whose regions give negatives (every Nth), and the negatives mined per stage.
     const size_t negEvery = static_cast<size_t>(std::max(1.0, eye ? env_num("EYE_NEG_EVERY", 1) : env_num("MOUTH_NEG_EVERY", 2)));
@@ -633,7 +676,8 @@ int main(int argc, char** argv) {
               for (int dx = -1; dx <= 1; ++dx) {
                 if ((dx && dy) || ((dx || dy) && !neighbours)) continue;
                 int x = L.tx + dx, y = L.ty + dy;
-                if (x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh) add_window(pos, sp, L.mct.data(), lw, x, y);
+                if (posLevels[k] != 0 && x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh)
+                  add_window(pos, sp, L.mct.data(), lw, x, y);
               }
             if (i % negEvery == 0) levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
           }
@@ -644,13 +688,19 @@ int main(int argc, char** argv) {
                  sp.name, trainPos.size(), calPos.size(), levels.size(), missed, now() - t0);
     // Windows off the target are negatives; the later stages also learn to
     // reject windows close to it, so that the best hit sits on the target.
+    // The last stage may weigh up the windows just outside its tolerance
+    // (up to `ring` level pixels off), the ones that compete with the target.
+    const int ring = static_cast<int>(env_num(eye ? "EYE_RING" : "MOUTH_RING", 0));
+    const int ringCopies = static_cast<int>(env_num(eye ? "EYE_RING_COPIES" : "MOUTH_RING_COPIES", 1));
     const int tol[3] = {static_cast<int>(tolv[0]), static_cast<int>(tolv[1]), static_cast<int>(tolv[2])};
     std::fprintf(report, "%s: keep %g %g %g, eps %g, neighbours %d, tolerance %d %d %d, negatives from every %zu. face, %zu per stage\n",
                  sp.name, sp.keep[0], sp.keep[1], sp.keep[2], sp.eps, neighbours, tol[0], tol[1], tol[2], negEvery, negCount);
     auto cascade = train_cascade(
         sp, trainPos, calPos, levels, 1,
-        [&tol](const Level& L, int x, int y, size_t stage) {
-          return std::abs(x - L.tx) > tol[stage] || std::abs(y - L.ty) > tol[stage];
+        [&tol, ring, ringCopies](const Level& L, int x, int y, size_t stage) {
+          const int d = std::max(std::abs(x - L.tx), std::abs(y - L.ty));
+          if (d <= tol[stage]) return 0;
+          return stage == 2 && d <= ring ? ringCopies : 1;
         },
         negCount, report);
     if (eye)
