@@ -141,10 +141,12 @@ std::vector<int> analyse(const Picture& p, int mode, bool plain) {
   for (int i = 0; i < info.maxFace; ++i) {
     const caFaceBox& f = info.faceRect[i];
     const caEyePair& e = info.eyePoints[i];
-    w.insert(w.end(), {f.x, f.y, f.width, f.height, e.x1, e.y1, e.x2, e.y2, info.faceRotated[i], info.eyeValid[i],
-                       info.mouthCenter[i].x, info.mouthCenter[i].y, info.mouthRect[i].x, info.mouthRect[i].y,
-                       info.mouthRect[i].width, info.mouthRect[i].height, info.mouthAux[i].x, info.mouthAux[i].y,
-                       info.mouthAux[i].width, info.mouthAux[i].height});
+    const SMyPoint2& mc = info.mouthCenter[i];
+    const caFaceBox& mr = info.mouthRect[i];
+    const caFaceBox& ma = info.mouthAux[i];
+    w.insert(w.end(), {f.x, f.y, f.width, f.height, e.x1, e.y1, e.x2, e.y2});
+    w.insert(w.end(), {info.faceRotated[i], info.eyeValid[i], mc.x, mc.y});
+    w.insert(w.end(), {mr.x, mr.y, mr.width, mr.height, ma.x, ma.y, ma.width, ma.height});
   }
   ReleaseFaceBeautyPlus(&info);
   return w;

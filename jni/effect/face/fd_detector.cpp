@@ -161,19 +161,17 @@ bool fd_window_later_stages(const unsigned short* base, const int* offset, int* 
 constexpr int kFdMaxLevelSide = 673;  // the largest pyramid size
 void fd_first_stage_row(const unsigned short* line, const int* offset, int xs, int* acc) {
   for (int x = 0; x < xs; ++x) acc[x] = 0;
-  const int n = kFdStageFeatures[0];
-  int f = 0;
-  for (; f + 4 <= n; f += 4) {
-    const unsigned short *c0 = line + offset[f], *c1 = line + offset[f + 1];
-    const unsigned short *c2 = line + offset[f + 2], *c3 = line + offset[f + 3];
-    const uint8_t* a0 = m_nFrontalMCTAlpha + f * kMctCodes;
+  const int* off = offset;
+  const int* end = offset + kFdStageFeatures[0];
+  const uint8_t* a0 = m_nFrontalMCTAlpha;
+  for (; end - off >= 4; off += 4, a0 += 4 * kMctCodes) {
+    const unsigned short *c0 = line + off[0], *c1 = line + off[1], *c2 = line + off[2], *c3 = line + off[3];
     const uint8_t *a1 = a0 + kMctCodes, *a2 = a1 + kMctCodes, *a3 = a2 + kMctCodes;
     for (int x = 0; x < xs; ++x) acc[x] += a0[c0[x]] + a1[c1[x]] + a2[c2[x]] + a3[c3[x]];
   }
-  for (; f < n; ++f) {
-    const unsigned short* c = line + offset[f];
-    const uint8_t* a = m_nFrontalMCTAlpha + f * kMctCodes;
-    for (int x = 0; x < xs; ++x) acc[x] += a[c[x]];
+  for (; off < end; ++off, a0 += kMctCodes) {
+    const unsigned short* c = line + *off;
+    for (int x = 0; x < xs; ++x) acc[x] += a0[c[x]];
   }
 }
 
@@ -194,7 +192,8 @@ void fd_scan_row(const unsigned short* mct, int w, int y, const int* offset, Hit
 void fd_enroll_hit(int x, int y, int scale, int sum) {
   const int64_t s64 = scale;
   fd_enroll_Frontal(static_cast<int>((x * s64) >> 15), static_cast<int>((y * s64) >> 15),
-                    static_cast<int>((kFdWindowW * s64) >> 15), static_cast<int>((kFdWindowH * s64) >> 15), sum / 2);
+                    static_cast<int>((kFdWindowW * s64) >> 15), static_cast<int>((kFdWindowH * s64) >> 15),
+                    sum / 2);
 }
 }  // namespace
 
@@ -322,9 +321,9 @@ void fd_scan_levels_plain(const unsigned char* grey, int width, int height, int 
 // by level, rows top to bottom, x left to right), so the candidate lists end
 // exactly as after the plain pass.
 constexpr int kFdMaxLevels = 15;
-constexpr int kFdCodeRows = 32;   // picture rows per code band
-constexpr int kFdScanRows = 6;    // window rows (y step 2) per scan band
-constexpr int kFdBandHits = 32;   // hits kept per scan band
+constexpr int kFdCodeRows = 32;  // picture rows per code band
+constexpr int kFdScanRows = 6;   // window rows (y step 2) per scan band
+constexpr int kFdBandHits = 32;  // hits kept per scan band
 
 struct FdLevel {
   int w, h;
@@ -367,8 +366,11 @@ int fd_band_level(const FdLevel* level, int n, int band, bool scan) {
   return k;
 }
 
-// Windows rows of a level (tops y = 0, 2, ... below h - 24) and x positions.
-int fd_window_rows(const FdLevel& L) { return (L.h > kFdWindowH && L.w > kFdWindowW) ? (L.h - kFdWindowH + 1) / 2 : 0; }
+// Window rows of a level: tops y = 0, 2, ... below h - 24 (none when the
+// level is not larger than the window).
+int fd_window_rows(const FdLevel& L) {
+  return (L.h > kFdWindowH && L.w > kFdWindowW) ? (L.h - kFdWindowH + 1) / 2 : 0;
+}
 
 void fd_scan_band(const FdLevel& L, FdScanBand* band) {
   int offset[kFrontalFeatureCount];
@@ -378,8 +380,8 @@ void fd_scan_band(const FdLevel& L, FdScanBand* band) {
   for (int row = band->row0; row < band->row1 && !band->full; ++row) {
     fd_scan_row(L.mct, L.w, 2 * row, offset, [&](int x, int sum) {
       if (band->hits == kFdBandHits)
-        band->full = true;
-      else if (!band->full)
+        band->full = true;  // the rest of this row is dropped too: the band is scanned again
+      else
         band->hit[band->hits++] = FdHit{x, 2 * row, sum};
     });
   }
@@ -430,8 +432,9 @@ bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, i
     }
     L.mct = codes + codeAt;
     codeAt += size;
-    // The codes never written (first row and its neighbour, last row and the
-    // one before it) are zero, as in a cleared buffer.
+    // The codes the census walk leaves out (the first row and the first code
+    // of the second, the last row and the last code before it) are zero, as
+    // in a cleared buffer; the scan never reads them.
     std::memset(L.mct, 0, (static_cast<size_t>(L.w) + 1) * sizeof(unsigned short));
     std::memset(L.mct + size - L.w - 1, 0, (static_cast<size_t>(L.w) + 1) * sizeof(unsigned short));
     const int rows = fd_window_rows(L);
@@ -456,7 +459,10 @@ bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, i
       fd_scan_band_enrolling(L, bands[b]);
       continue;
     }
-    for (int i = 0; i < bands[b].hits; ++i) fd_enroll_hit(bands[b].hit[i].x, bands[b].hit[i].y, L.scale, bands[b].hit[i].sum);
+    for (int i = 0; i < bands[b].hits; ++i) {
+      const FdHit& hit = bands[b].hit[i];
+      fd_enroll_hit(hit.x, hit.y, L.scale, hit.sum);
+    }
   }
   px_free(greys);
   px_free(codes);
