@@ -1,9 +1,11 @@
 #include "fd_detector.h"
 
+#include <atomic>
 #include <cmath>
 #include <cstring>
 
 #include "effect/kalo/px_mem.h"
+#include "effect/kalo/px_parallel.h"
 #include "models/face_models.h"
 
 const int kFdStageFeatures[kFdStageCount] = {24, 50, 170, 440};
@@ -118,6 +120,83 @@ int fd_eval_window(const unsigned short* mct, int levelWidth, int x, int y, int*
   return kFdStageCount;
 }
 
+namespace {
+// Per-level feature offsets (x + y * levelWidth), so a window is look-ups only.
+void fd_feature_offsets(int sw, int* offset) {
+  for (int f = 0; f < kFrontalFeatureCount; ++f) offset[f] = m_nFrontalMCTFeatureY0[f] * sw + m_nFrontalMCTFeatureX0[f];
+}
+
+// Stages 2 to 4 of the window at `base` (its top-left code); true when all
+// pass, with the last stage sum in *sum. The weights are bytes, so a stage's
+// running sum never falls: once it exceeds the threshold the window is
+// rejected without adding the stage's remaining features (checked every
+// eight features; the decision is the one the full sum gives).
+bool fd_window_later_stages(const unsigned short* base, const int* offset, int* sum) {
+  // Walked with pointers: with int arithmetic wrapping (-fwrapv) indexed
+  // forms cost an extra sign extension per feature.
+  const int* off = offset + kFdStageFeatures[0];
+  const uint8_t* alpha = m_nFrontalMCTAlpha + kFdStageFeatures[0] * kMctCodes;
+  int s = 0;
+  for (int stage = 1; stage < kFdStageCount; ++stage) {
+    const int threshold = kFdStageThresholds[stage];
+    const int* end = off + kFdStageFeatures[stage];
+    s = 0;
+    for (; end - off >= 8; off += 8, alpha += 8 * kMctCodes) {
+      s += alpha[0 * kMctCodes + base[off[0]]] + alpha[1 * kMctCodes + base[off[1]]] +
+           alpha[2 * kMctCodes + base[off[2]]] + alpha[3 * kMctCodes + base[off[3]]] +
+           alpha[4 * kMctCodes + base[off[4]]] + alpha[5 * kMctCodes + base[off[5]]] +
+           alpha[6 * kMctCodes + base[off[6]]] + alpha[7 * kMctCodes + base[off[7]]];
+      if (s > threshold) return false;
+    }
+    for (; off < end; ++off, alpha += kMctCodes) s += alpha[base[*off]];
+    if (s > threshold) return false;
+  }
+  *sum = s;
+  return true;
+}
+
+// First-stage sums of the windows x = 0 .. xs - 1 of one window row, feature
+// by feature across the row (four features at a time): each feature reads a
+// run of neighbouring codes, and nearly all windows end in this stage.
+constexpr int kFdMaxLevelSide = 673;  // the largest pyramid size
+void fd_first_stage_row(const unsigned short* line, const int* offset, int xs, int* acc) {
+  for (int x = 0; x < xs; ++x) acc[x] = 0;
+  const int* off = offset;
+  const int* end = offset + kFdStageFeatures[0];
+  const uint8_t* a0 = m_nFrontalMCTAlpha;
+  for (; end - off >= 4; off += 4, a0 += 4 * kMctCodes) {
+    const unsigned short *c0 = line + off[0], *c1 = line + off[1], *c2 = line + off[2], *c3 = line + off[3];
+    const uint8_t *a1 = a0 + kMctCodes, *a2 = a1 + kMctCodes, *a3 = a2 + kMctCodes;
+    for (int x = 0; x < xs; ++x) acc[x] += a0[c0[x]] + a1[c1[x]] + a2[c2[x]] + a3[c3[x]];
+  }
+  for (; off < end; ++off, a0 += kMctCodes) {
+    const unsigned short* c = line + *off;
+    for (int x = 0; x < xs; ++x) acc[x] += a0[c[x]];
+  }
+}
+
+// Scans the window row at top y of a level of width w (codes `mct`), calling
+// hit(x, lastStageSum) for every window that passes, x left to right.
+template <class Hit>
+void fd_scan_row(const unsigned short* mct, int w, int y, const int* offset, Hit&& hit) {
+  int acc[kFdMaxLevelSide];
+  const int xs = w - kFdWindowW;
+  const unsigned short* line = mct + static_cast<ptrdiff_t>(y) * w;
+  fd_first_stage_row(line, offset, xs, acc);
+  for (int x = 0; x < xs; ++x) {
+    int sum;
+    if (acc[x] <= kFdStageThresholds[0] && fd_window_later_stages(line + x, offset, &sum)) hit(x, sum);
+  }
+}
+
+void fd_enroll_hit(int x, int y, int scale, int sum) {
+  const int64_t s64 = scale;
+  fd_enroll_Frontal(static_cast<int>((x * s64) >> 15), static_cast<int>((y * s64) >> 15),
+                    static_cast<int>((kFdWindowW * s64) >> 15), static_cast<int>((kFdWindowH * s64) >> 15),
+                    sum / 2);
+}
+}  // namespace
+
 void fd_scan_frontal(int sw, int sh, int width, int height, const unsigned short* mct) {
   (void)height;
   if (sh <= kFdWindowH || sw <= kFdWindowW || !mct) return;
@@ -165,16 +244,18 @@ void Rotate(const unsigned char* src, unsigned char* dst, int width, int height,
     default: c = 1024; s = 0; break;
   }
   const int cx = width >> 1, cy = height >> 1;
-  for (int oy = 0; oy < height; ++oy) {
-    const int dy = cy - oy;
-    for (int ox = 0; ox < width; ++ox) {
-      const int dx = ox - cx;
-      const int sx = cx + ((dx * c - dy * s) >> 10);
-      const int sy = cy - ((dx * s + dy * c) >> 10);
-      dst[static_cast<size_t>(oy) * width + ox] =
-          (sx >= 0 && sx < width && sy >= 0 && sy < height) ? src[static_cast<size_t>(sy) * width + sx] : 0;
+  px_for_rows(height, [&](int y0, int y1) {  // every row on its own: bands on worker threads
+    for (int oy = y0; oy < y1; ++oy) {
+      const int dy = cy - oy;
+      for (int ox = 0; ox < width; ++ox) {
+        const int dx = ox - cx;
+        const int sx = cx + ((dx * c - dy * s) >> 10);
+        const int sy = cy - ((dx * s + dy * c) >> 10);
+        dst[static_cast<size_t>(oy) * width + ox] =
+            (sx >= 0 && sx < width && sy >= 0 && sy < height) ? src[static_cast<size_t>(sy) * width + sx] : 0;
+      }
     }
-  }
+  });
 }
 
 SMyRect2 InvRotate(SMyRect2 b, int width, int height, int angle) {
@@ -193,26 +274,32 @@ SMyRect2 InvRotate(SMyRect2 b, int width, int height, int angle) {
   return r;
 }
 
-int fd_find_run(const unsigned char* grey, int width, int height, int unusedFlag, int rotated, int angle,
-                int precision) {
-  (void)unusedFlag;
-  fd_reset_candidates();
-  if (!grey || width < 1 || height < 1) return m_nFaceCount;
-  const int longer = width > height ? width : height, shorter = width > height ? height : width;
-  const int r = static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
-  const int levels = fd_pyramid_count(precision);
-  // One buffer pair for the largest level used.
+namespace {
+// Size of pyramid level k of a pass over a width x height picture whose
+// shorter / longer side ratio is r (Q15); false from the first size above the
+// longer side on.
+bool fd_level_size(int k, int width, int height, int r, int* lw, int* lh) {
+  const int longer = width > height ? width : height;
+  const int s = kFdPyramid[k];
+  if (s > longer) return false;
+  int other = width == height ? s : static_cast<int>((static_cast<int64_t>(s) * r) >> 15);
+  if (other < 4) other = 4;
+  *lw = width >= height ? s : other;
+  *lh = width >= height ? other : s;
+  return true;
+}
+
+// The plain pass: one grey and one code buffer for the largest level, levels
+// built and scanned one after the other on the calling thread.
+void fd_scan_levels_plain(const unsigned char* grey, int width, int height, int r, int levels) {
+  const int longer = width > height ? width : height;
   const int top = kFdPyramid[levels - 1] < longer ? kFdPyramid[levels - 1] : longer;
   const size_t cap = static_cast<size_t>(top) * top;
   auto* level = static_cast<unsigned char*>(px_malloc(cap, 1));
   auto* mct = static_cast<unsigned short*>(px_calloc(cap, sizeof(unsigned short)));
   if (level && mct) {
-    for (int k = 0; k < levels; ++k) {
-      const int s = kFdPyramid[k];
-      if (s > longer) break;
-      int other = width == height ? s : static_cast<int>((static_cast<int64_t>(s) * r) >> 15);
-      if (other < 4) other = 4;
-      const int lw = width >= height ? s : other, lh = width >= height ? other : s;
+    int lw, lh;
+    for (int k = 0; k < levels && fd_level_size(k, width, height, r, &lw, &lh); ++k) {
       const unsigned char* img = grey;
       if (lw != width || lh != height) {
         Resize_NN(grey, width, height, level, lw, lh);
@@ -224,6 +311,176 @@ int fd_find_run(const unsigned char* grey, int width, int height, int unusedFlag
   }
   px_free(level);
   px_free(mct);
+}
+
+// ---- The threaded pass ----
+// Every level gets buffers of its own. The levels are resampled, turned into
+// codes in bands of rows and scanned in bands of window rows on worker
+// threads; each scan band keeps its hits. The hits are then enrolled on the
+// calling thread band by band, in the order the plain scan meets them (level
+// by level, rows top to bottom, x left to right), so the candidate lists end
+// exactly as after the plain pass.
+constexpr int kFdMaxLevels = 15;
+constexpr int kFdCodeRows = 32;  // picture rows per code band
+constexpr int kFdScanRows = 6;   // window rows (y step 2) per scan band
+constexpr int kFdBandHits = 32;  // hits kept per scan band
+
+struct FdLevel {
+  int w, h;
+  int scale;                  // (width << 15) / w
+  const unsigned char* grey;  // the picture itself or `own`
+  unsigned char* own;         // the resampled level, null when not needed
+  unsigned short* mct;
+  int codeBand0, scanBand0;   // index of the level's first code and scan band
+};
+
+struct FdHit {
+  int x, y, sum;
+};
+
+struct FdScanBand {
+  int level, row0, row1;  // window rows row0 .. row1 - 1 (window top y = 2 * row)
+  int hits;
+  bool full;              // more hits than room: scanned again while enrolling
+  FdHit hit[kFdBandHits];
+};
+
+// Runs task(i) for i = 0 .. count - 1 on the worker threads; each worker takes
+// the next task not yet taken, so uneven tasks still share out well. The
+// tasks write only their own results, so the order they run in does not matter.
+template <class Task>
+void fd_run_tasks(int count, Task&& task) {
+  std::atomic<int> next{0};
+  px_for_rows(
+      count,
+      [&](int, int) {
+        for (int i = next.fetch_add(1); i < count; i = next.fetch_add(1)) task(i);
+      },
+      1);
+}
+
+// The level a band index belongs to (bands are numbered level after level).
+int fd_band_level(const FdLevel* level, int n, int band, bool scan) {
+  int k = 0;
+  while (k + 1 < n && band >= (scan ? level[k + 1].scanBand0 : level[k + 1].codeBand0)) ++k;
+  return k;
+}
+
+// Window rows of a level: tops y = 0, 2, ... below h - 24 (none when the
+// level is not larger than the window).
+int fd_window_rows(const FdLevel& L) {
+  return (L.h > kFdWindowH && L.w > kFdWindowW) ? (L.h - kFdWindowH + 1) / 2 : 0;
+}
+
+void fd_scan_band(const FdLevel& L, FdScanBand* band) {
+  int offset[kFrontalFeatureCount];
+  fd_feature_offsets(L.w, offset);
+  band->hits = 0;
+  band->full = false;
+  for (int row = band->row0; row < band->row1 && !band->full; ++row) {
+    fd_scan_row(L.mct, L.w, 2 * row, offset, [&](int x, int sum) {
+      if (band->hits == kFdBandHits)
+        band->full = true;  // the rest of this row is dropped too: the band is scanned again
+      else
+        band->hit[band->hits++] = FdHit{x, 2 * row, sum};
+    });
+  }
+}
+
+// The same band scanned on the calling thread, enrolling as it goes.
+void fd_scan_band_enrolling(const FdLevel& L, const FdScanBand& band) {
+  int offset[kFrontalFeatureCount];
+  fd_feature_offsets(L.w, offset);
+  for (int row = band.row0; row < band.row1; ++row)
+    fd_scan_row(L.mct, L.w, 2 * row, offset, [&](int x, int sum) { fd_enroll_hit(x, 2 * row, L.scale, sum); });
+}
+
+// False when the buffers cannot be had (the caller then takes the plain pass).
+bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, int r, int levels) {
+  FdLevel level[kFdMaxLevels];
+  int n = 0, codeBands = 0, scanBands = 0;
+  size_t greyTotal = 0, codeTotal = 0;
+  int lw, lh;
+  for (int k = 0; k < levels && k < kFdMaxLevels && fd_level_size(k, width, height, r, &lw, &lh); ++k) {
+    FdLevel& L = level[n++];
+    L = FdLevel{lw, lh, static_cast<int>((static_cast<int64_t>(width) << 15) / lw), grey, nullptr, nullptr,
+                codeBands, scanBands};
+    const size_t size = static_cast<size_t>(lw) * lh;
+    if (lw != width || lh != height) greyTotal += size;
+    codeTotal += size;
+    codeBands += (lh + kFdCodeRows - 1) / kFdCodeRows;
+    scanBands += (fd_window_rows(L) + kFdScanRows - 1) / kFdScanRows;
+  }
+  if (n == 0) return true;
+  auto* greys = static_cast<unsigned char*>(px_malloc(greyTotal > 0 ? greyTotal : 1, 1));
+  auto* codes = static_cast<unsigned short*>(px_malloc(codeTotal, sizeof(unsigned short)));
+  auto* bands = static_cast<FdScanBand*>(px_malloc(scanBands > 0 ? scanBands : 1, sizeof(FdScanBand)));
+  if (!greys || !codes || !bands) {
+    px_free(greys);
+    px_free(codes);
+    px_free(bands);
+    return false;
+  }
+  size_t greyAt = 0, codeAt = 0;
+  for (int k = 0; k < n; ++k) {
+    FdLevel& L = level[k];
+    const size_t size = static_cast<size_t>(L.w) * L.h;
+    if (L.w != width || L.h != height) {
+      L.own = greys + greyAt;
+      L.grey = L.own;
+      greyAt += size;
+    }
+    L.mct = codes + codeAt;
+    codeAt += size;
+    // The codes the census walk leaves out (the first row and the first code
+    // of the second, the last row and the last code before it) are zero, as
+    // in a cleared buffer; the scan never reads them.
+    std::memset(L.mct, 0, (static_cast<size_t>(L.w) + 1) * sizeof(unsigned short));
+    std::memset(L.mct + size - L.w - 1, 0, (static_cast<size_t>(L.w) + 1) * sizeof(unsigned short));
+    const int rows = fd_window_rows(L);
+    for (int row = 0, b = L.scanBand0; row < rows; row += kFdScanRows, ++b) {
+      bands[b].level = k;
+      bands[b].row0 = row;
+      bands[b].row1 = row + kFdScanRows < rows ? row + kFdScanRows : rows;
+    }
+  }
+  fd_run_tasks(n, [&](int k) {
+    if (level[k].own) Resize_NN(grey, width, height, level[k].own, level[k].w, level[k].h);
+  });
+  fd_run_tasks(codeBands, [&](int b) {
+    const FdLevel& L = level[fd_band_level(level, n, b, false)];
+    const int row0 = (b - L.codeBand0) * kFdCodeRows;
+    image2MCT_FD_rows(L.grey, L.w, L.h, row0, row0 + kFdCodeRows < L.h ? row0 + kFdCodeRows : L.h, L.mct);
+  });
+  fd_run_tasks(scanBands, [&](int b) { fd_scan_band(level[bands[b].level], &bands[b]); });
+  for (int b = 0; b < scanBands; ++b) {
+    const FdLevel& L = level[bands[b].level];
+    if (bands[b].full) {
+      fd_scan_band_enrolling(L, bands[b]);
+      continue;
+    }
+    for (int i = 0; i < bands[b].hits; ++i) {
+      const FdHit& hit = bands[b].hit[i];
+      fd_enroll_hit(hit.x, hit.y, L.scale, hit.sum);
+    }
+  }
+  px_free(greys);
+  px_free(codes);
+  px_free(bands);
+  return true;
+}
+}  // namespace
+
+int fd_find_run(const unsigned char* grey, int width, int height, int unusedFlag, int rotated, int angle,
+                int precision) {
+  (void)unusedFlag;
+  fd_reset_candidates();
+  if (!grey || width < 1 || height < 1) return m_nFaceCount;
+  const int longer = width > height ? width : height, shorter = width > height ? height : width;
+  const int r = static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
+  const int levels = fd_pyramid_count(precision);
+  if (px_scalar_only() || !fd_scan_levels_threaded(grey, width, height, r, levels))
+    fd_scan_levels_plain(grey, width, height, r, levels);
   for (int i = 0; i < m_nFaceCandidateCountFrontal; ++i) {
     if (!m_bFaceCandidateValidFrontal[i] || m_nFaceCandidateIntersectionCountFrontal[i] < 3) continue;
     SMyRect2 box = m_rcFaceCandidateFrontal[i];

@@ -65,5 +65,10 @@ void FlipX(unsigned char* image, int width, int height);
 // column takes its right column from the next row (and one centred on the
 // first column its left column from the row above). Codes 0..510.
 void image2MCT_FD(const unsigned char* grey, int width, int height, unsigned short* mct);
+// The codes image2MCT_FD writes whose centres lie in rows row0 .. row1 - 1
+// (the same flat walk, so the wrap at the row ends is kept); bands of rows
+// can be computed independently. image2MCT_FD uses it unless the scalar
+// switch is on.
+void image2MCT_FD_rows(const unsigned char* grey, int width, int height, int row0, int row1, unsigned short* mct);
 // The same code for the eye and mouth detectors.
 void image2MCT9_1(const unsigned char* grey, int width, int height, unsigned short* mct);
