@@ -101,3 +101,18 @@ void split_held_out(std::vector<LandmarkFace>& faces, std::vector<LandmarkFace>*
   for (size_t i = 0; i < faces.size(); ++i) (i % 10 == 9 && held ? *held : train).push_back(faces[i]);
   faces.swap(train);
 }
+
+void keep_agreeing(std::vector<LandmarkFace>& faces, const std::vector<LandmarkFace>& other, double limit) {
+  std::map<std::string, const LandmarkFace*> by;
+  for (const LandmarkFace& f : other) by[f.path] = &f;
+  std::vector<LandmarkFace> kept;
+  for (const LandmarkFace& a : faces) {
+    auto it = by.find(a.path);
+    if (it == by.end()) continue;
+    const LandmarkFace& b = *it->second;
+    const double d = std::hypot(a.x[1] - a.x[0], a.y[1] - a.y[0]);
+    if (std::max(std::hypot(a.x[0] - b.x[0], a.y[0] - b.y[0]), std::hypot(a.x[1] - b.x[1], a.y[1] - b.y[1])) <= limit * d)
+      kept.push_back(a);
+  }
+  faces.swap(kept);
+}

@@ -19,6 +19,9 @@ std::vector<LandmarkFace> load_landmarks(const std::string& root, const std::str
 // Grey (R + G + B) / 3 image, as the engine sees it.
 cv::Mat load_grey(const std::string& path);
 std::vector<std::string> list_images(const std::string& dir);
+// Keeps the faces whose eyes `other` (the same faces, another annotation)
+// places within limit eye distances of theirs.
+void keep_agreeing(std::vector<LandmarkFace>& faces, const std::vector<LandmarkFace>& other, double limit);
 // Every tenth face of the training list is held out for measuring the eye
 // and mouth error on faces annotated like the training faces.
 void split_held_out(std::vector<LandmarkFace>& faces, std::vector<LandmarkFace>* held);

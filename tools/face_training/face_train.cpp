@@ -465,6 +465,8 @@ void write_model(const std::string& path, const Spec& sp, const std::vector<Stag
 }  // namespace
 
 int main(int argc, char** argv) {
+  // FACE_SEED: another random sequence, to see how much a result owes to it.
+  rng.seed(static_cast<unsigned>(env_num("FACE_SEED", 20240611)));
   if (argc < 3) {
     std::fprintf(stderr, "usage: face_train DATA_DIR OUT_DIR [face|eye|mouth ...]\n");
     return 2;
@@ -478,9 +480,14 @@ int main(int argc, char** argv) {
   }
   FILE* report = stdout;
   double t0 = now();
-  std::vector<LandmarkFace> faces = load_landmarks(data, "new_training", std::getenv("FACE_LABELS") ? std::getenv("FACE_LABELS") : "");
+  // FACE_LABELS: "dlib" or "mean" train on the second annotation (see
+  // face_relabel) or the mean of both; "agree" on the MTFL points of the
+  // faces where the two annotations place the eyes within 0.1 eye distances.
+  const std::string labels = std::getenv("FACE_LABELS") ? std::getenv("FACE_LABELS") : "";
+  std::vector<LandmarkFace> faces = load_landmarks(data, "new_training", labels == "agree" ? "" : labels);
   std::vector<LandmarkFace> held;
   split_held_out(faces, &held);
+  if (labels == "agree") keep_agreeing(faces, load_landmarks(data, "new_training", "dlib"), 0.1);
   std::fprintf(report, "%zu training faces with checked landmarks (%zu held out)\n", faces.size(), held.size());
   std::vector<cv::Mat> greys;
   for (const auto& f : faces) greys.push_back(load_grey(f.path));
@@ -602,10 +609,11 @@ int main(int argc, char** argv) {
     const bool neighbours = env_num(eye ? "EYE_NEIGHBOURS" : "MOUTH_NEIGHBOURS", 0) != 0;
     // Levels (33, 30, 27, 24 wide) whose target windows are positives.
     const std::vector<double> posLevels = env_list(eye ? "EYE_POS_LEVELS" : "MOUTH_POS_LEVELS", {1, 1, 1, 1});
-    const std::vector<double> tolv = eye ? env_list("EYE_TOL", {3, 2, 1}) : env_list("MOUTH_TOL", {2, 1, 1});
+    const std::vector<double> tolv = eye ? env_list("EYE_TOL", {3, 3, 3}) : env_list("MOUTH_TOL", {2, 1, 1});
     // Faces whose regions give negatives (every Nth), and the negatives mined per stage.
     const size_t negEvery = static_cast<size_t>(std::max(1.0, eye ? env_num("EYE_NEG_EVERY", 1) : env_num("MOUTH_NEG_EVERY", 2)));
     const size_t negCount = static_cast<size_t>(eye ? env_num("EYE_NEGS", 100000) : env_num("MOUTH_NEGS", 40000));
+    const int copies = static_cast<int>(std::max(1.0, env_num(eye ? "EYE_COPIES" : "MOUTH_COPIES", 1)));
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
       cv::Mat fl = flip(greys[i]);
@@ -641,6 +649,17 @@ int main(int argc, char** argv) {
           box = SMyRect2{static_cast<int>(cx - bw / 2), static_cast<int>(cy - bh / 2), 0, 0};
           box.right = box.left + static_cast<int>(bw);
           box.bottom = box.top + static_cast<int>(bh);
+        }
+        // Extra copies (PART_COPIES > 1): the same face with the box jittered
+        // by +-7 % in scale and +-4 % in position; they add positives only.
+        const SMyRect2 found0 = box;
+        for (int copy = 0; copy < copies; ++copy) {
+        if (copy) {
+          double js = uni(0.93, 1.07), bw0 = found0.right - found0.left, bh0 = found0.bottom - found0.top;
+          double cx = found0.left + bw0 / 2 + uni(-0.04, 0.04) * bw0, cy = found0.top + bh0 / 2 + uni(-0.04, 0.04) * bw0;
+          box = SMyRect2{static_cast<int>(cx - bw0 * js / 2), static_cast<int>(cy - bh0 * js / 2), 0, 0};
+          box.right = box.left + static_cast<int>(bw0 * js);
+          box.bottom = box.top + static_cast<int>(bh0 * js);
         }
         for (int side = 0; side < (eye ? 2 : 1); ++side) {
           SMyRect2 r;
@@ -679,8 +698,9 @@ int main(int argc, char** argv) {
                 if (posLevels[k] != 0 && x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh)
                   add_window(pos, sp, L.mct.data(), lw, x, y);
               }
-            if (i % negEvery == 0) levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
+            if (copy == 0 && i % negEvery == 0) levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
           }
+        }
         }
       }
     }
