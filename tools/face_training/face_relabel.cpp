@@ -17,6 +17,7 @@
 #include <dlib/image_processing/frontal_face_detector.h>
 #include <dlib/opencv.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <fstream>
