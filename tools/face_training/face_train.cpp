@@ -654,57 +654,60 @@ int main(int argc, char** argv) {
         // by +-7 % in scale and +-4 % in position; they add positives only.
         const SMyRect2 found0 = box;
         for (int copy = 0; copy < copies; ++copy) {
-        if (copy) {
-          double js = uni(0.93, 1.07), bw0 = found0.right - found0.left, bh0 = found0.bottom - found0.top;
-          double cx = found0.left + bw0 / 2 + uni(-0.04, 0.04) * bw0, cy = found0.top + bh0 / 2 + uni(-0.04, 0.04) * bw0;
-          box = SMyRect2{static_cast<int>(cx - bw0 * js / 2), static_cast<int>(cy - bh0 * js / 2), 0, 0};
-          box.right = box.left + static_cast<int>(bw0 * js);
-          box.bottom = box.top + static_cast<int>(bh0 * js);
-        }
-        for (int side = 0; side < (eye ? 2 : 1); ++side) {
-          SMyRect2 r;
-          double tx, ty;
-          if (eye) {
-            SMyRect2 L, R;
-            ed_regions(box, &L, &R);
-            r = side ? R : L;
-            tx = side ? r.right - sc(p.rx) : sc(p.lx) - r.left;
-            ty = (side ? sc(p.ry) : sc(p.ly)) - r.top;
-          } else {
-            r = md_region(box, gh);
-            tx = sc(p.mx) - r.left;
-            ty = sc(p.my) - r.top;
+          if (copy) {
+            double js = uni(0.93, 1.07), bw0 = found0.right - found0.left, bh0 = found0.bottom - found0.top;
+            double cx = found0.left + bw0 / 2 + uni(-0.04, 0.04) * bw0,
+                   cy = found0.top + bh0 / 2 + uni(-0.04, 0.04) * bw0;
+            box = SMyRect2{static_cast<int>(cx - bw0 * js / 2), static_cast<int>(cy - bh0 * js / 2), 0, 0};
+            box.right = box.left + static_cast<int>(bw0 * js);
+            box.bottom = box.top + static_cast<int>(bh0 * js);
           }
-          int rw = r.right - r.left, rh = r.bottom - r.top;
-          if (rw < 4 || rh < 4) continue;
-          std::vector<uint8_t> region(rw * rh);
-          edmd_copy_region(g.data(), gw, gh, r, region.data());
-          if (eye && side) FlipX(region.data(), rw, rh);
-          int widths[4], heights[4];
-          int n = edmd_levels(rw, rh, eye ? 22 : 13, widths, heights);
-          for (int k = 0; k < n; ++k) {
-            int lw = widths[k], lh = heights[k];
-            std::vector<uint8_t> lv(lw * lh);
-            Resize_BI(region.data(), rw, rh, lv.data(), lw, lh);
-            Level L{lw, lh, std::vector<uint16_t>(lw * lh, 0)};
-            image2MCT9_1(lv.data(), lw, lh, L.mct.data());
-            double k2 = double(lw) / rw;
-            L.tx = static_cast<int>(std::lround(tx * k2 - sp.ww / 2.0));
-            L.ty = static_cast<int>(std::lround(ty * k2 - sp.wh / 2.0));
-            for (int dy = -1; dy <= 1; ++dy)
-              for (int dx = -1; dx <= 1; ++dx) {
-                if ((dx && dy) || ((dx || dy) && !neighbours)) continue;
-                int x = L.tx + dx, y = L.ty + dy;
-                if (posLevels[k] != 0 && x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh)
-                  add_window(pos, sp, L.mct.data(), lw, x, y);
-              }
-            if (copy == 0 && i % negEvery == 0) levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
+          for (int side = 0; side < (eye ? 2 : 1); ++side) {
+            SMyRect2 r;
+            double tx, ty;
+            if (eye) {
+              SMyRect2 L, R;
+              ed_regions(box, &L, &R);
+              r = side ? R : L;
+              tx = side ? r.right - sc(p.rx) : sc(p.lx) - r.left;
+              ty = (side ? sc(p.ry) : sc(p.ly)) - r.top;
+            } else {
+              r = md_region(box, gh);
+              tx = sc(p.mx) - r.left;
+              ty = sc(p.my) - r.top;
+            }
+            int rw = r.right - r.left, rh = r.bottom - r.top;
+            if (rw < 4 || rh < 4) continue;
+            std::vector<uint8_t> region(rw * rh);
+            edmd_copy_region(g.data(), gw, gh, r, region.data());
+            if (eye && side) FlipX(region.data(), rw, rh);
+            int widths[4], heights[4];
+            int n = edmd_levels(rw, rh, eye ? 22 : 13, widths, heights);
+            for (int k = 0; k < n; ++k) {
+              int lw = widths[k], lh = heights[k];
+              std::vector<uint8_t> lv(lw * lh);
+              Resize_BI(region.data(), rw, rh, lv.data(), lw, lh);
+              Level L{lw, lh, std::vector<uint16_t>(lw * lh, 0)};
+              image2MCT9_1(lv.data(), lw, lh, L.mct.data());
+              double k2 = double(lw) / rw;
+              L.tx = static_cast<int>(std::lround(tx * k2 - sp.ww / 2.0));
+              L.ty = static_cast<int>(std::lround(ty * k2 - sp.wh / 2.0));
+              for (int dy = -1; dy <= 1; ++dy)
+                for (int dx = -1; dx <= 1; ++dx) {
+                  if ((dx && dy) || ((dx || dy) && !neighbours)) continue;
+                  int x = L.tx + dx, y = L.ty + dy;
+                  if (posLevels[k] != 0 && x >= 0 && y >= 0 && x < lw - sp.ww && y < lh - sp.wh)
+                    add_window(pos, sp, L.mct.data(), lw, x, y);
+                }
+              if (copy == 0 && i % negEvery == 0)
+                levels.push_back(std::move(L));  // every negEvery-th face serves as a negative source
+            }
           }
-        }
         }
       }
     }
-    std::fprintf(report, "%s: %zu + %zu calibration positive windows, %zu region levels, detector missed %d faces (%.0f s)\n",
+    std::fprintf(report,
+                 "%s: %zu + %zu calibration positive windows, %zu region levels, detector missed %d faces (%.0f s)\n",
                  sp.name, trainPos.size(), calPos.size(), levels.size(), missed, now() - t0);
     // Windows off the target are negatives; the later stages also learn to
     // reject windows close to it, so that the best hit sits on the target.
