@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <cstdlib>
 #include <random>
@@ -294,6 +295,50 @@ TEST(BlurSteps, DegeneratePicturesStayInBounds) {
   }
   EXPECT_EQ(px_make_blur(nullptr, nullptr, nullptr, 4, 4, 1, 0, 3, 0, 3), PX_ERR_NULL);
   EXPECT_EQ(px_apply_tiltshift(nullptr, nullptr, 4, 4, 1, 1), PX_ERR_NULL);
+}
+
+namespace {
+// A grey ramp along the longer side, one level step per `run` pixels.
+std::vector<int> ramp(int w, int h) {
+  std::vector<int> p(static_cast<size_t>(w) * h);
+  const int n = w > h ? w : h;
+  for (int y = 0; y < h; ++y) {
+    for (int x = 0; x < w; ++x) {
+      const int v = static_cast<int>(static_cast<int64_t>(w > h ? x : y) * 255 / n);
+      p[static_cast<size_t>(y) * w + x] = rgb(v, v, v);
+    }
+  }
+  return p;
+}
+
+int max_difference(const std::vector<int>& a, const std::vector<int>& b) {
+  int worst = 0;
+  for (size_t i = 0; i < a.size(); ++i) {
+    for (int c = 0; c < 3; ++c) worst = std::max(worst, std::abs(chan(a[i], c) - chan(b[i], c)));
+  }
+  return worst;
+}
+}  // namespace
+
+TEST(BlurSteps, ThinStripsKeepTheirPlace) {
+  // A strip whose short side the size table would empty is reduced less, with
+  // each side's own step and an index that is not cut to 11 bits: level 0 and
+  // the far rows of a tilt-shift stay on the ramp, however long the strip.
+  for (auto [w, h] : {std::pair{1, 2469}, {3422, 3}, {2, 5000}, {9000, 5}}) {
+    SCOPED_TRACE(testing::Message() << w << " x " << h);
+    EXPECT_TRUE(px_blur_thin(w, h));
+    const std::vector<int> src = ramp(w, h);
+    std::vector<int> dst(src.size());
+    EXPECT_EQ(px_make_blur(src.data(), nullptr, dst.data(), w, h, 0, 0, -1, 0, -1), PX_OK);
+    EXPECT_LE(max_difference(src, dst), 3);
+    const int centre = h > w ? h / 2 : 0;
+    EXPECT_EQ(px_apply_tiltshift(src.data(), dst.data(), w, h, centre, 0), PX_OK);
+    EXPECT_LE(max_difference(src, dst), 4);
+  }
+  // Ordinary pictures keep the size table's shift and the crossed steps.
+  EXPECT_FALSE(px_blur_thin(4000, 3000));
+  EXPECT_FALSE(px_blur_thin(4000, 40));
+  EXPECT_FALSE(px_blur_thin(40000, 20));
 }
 
 // ---- effect 38 ------------------------------------------------------------------

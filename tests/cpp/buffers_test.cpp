@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <vector>
 
 #include "effect/object/px_stored_region.h"
@@ -63,6 +64,19 @@ TEST(StoredRegion, StoreRecoverDelete) {
   // An empty rectangle saves an empty block: recovering it copies nothing.
   ASSERT_EQ(px_store_region(PX_STORED_OBJECT, pic.data(), 4, 6, px_rect{1, 3, 2, 1}), 0);
   EXPECT_EQ(px_recover_region(PX_STORED_OBJECT, target.data(), 4, 6, px_rect{0, 5, 0, 3}), 0);
+  EXPECT_EQ(target[0], 7);
+  // A rectangle empty on one axis only, however far its other bounds reach,
+  // walks no row and forms no pointer outside the array.
+  const int far_bounds[][4] = {{1, 0, INT32_MIN, -2}, {9, 8, 11, INT32_MAX}, {0, 5, 3, 2}};
+  for (const auto& b : far_bounds) {
+    const px_rect r{b[0], b[1], b[2], b[3]};
+    ASSERT_EQ(px_store_region(PX_STORED_OBJECT, pic.data(), 4, 6, r), 0);
+    ASSERT_TRUE(px_stored_region_size(PX_STORED_OBJECT, &w, &h));
+    EXPECT_EQ(w * h, 0);
+    EXPECT_EQ(px_recover_region(PX_STORED_OBJECT, target.data(), 4, 6, r), 0);
+  }
+  ASSERT_EQ(px_store_region(PX_STORED_OBJECT, pic.data(), 4, 6, px_rect{0, 1, 0, 1}), 0);
+  EXPECT_EQ(px_recover_region(PX_STORED_OBJECT, target.data(), 4, 6, px_rect{1, 0, INT32_MIN, -2}), 0);
   EXPECT_EQ(target[0], 7);
   px_delete_stored_region(PX_STORED_OBJECT);
   EXPECT_FALSE(px_stored_region_size(PX_STORED_OBJECT, nullptr, nullptr));

@@ -187,6 +187,23 @@ TEST(EffectLibrary, CancelOnlyWhileBusy) {
   EXPECT_EQ(iel_progress::busy.load(), 0u);
 }
 
+TEST(EffectLibrary, ProgressNeverPassesAHundred) {
+  {
+    IELProgressScope scope;
+    // A count left by a long effect read against a short effect's total
+    // (a stale read from another thread) is reported as done, not as 36900 %.
+    scope.start(1000, 0);
+    scope.advance(1000);
+    iel_progress::total.store(1);
+    iel_progress::done.store(369);
+    EXPECT_EQ(IEL_GetProgress(), 100u);
+    // A new total starts from a cleared count; large counts do not wrap.
+    scope.start(50000000, 0);
+    scope.advance(49999999);
+    EXPECT_EQ(IEL_GetProgress(), 99u);
+  }
+}
+
 TEST(EffectLibrary, Version) {
   LogCapture log;
   EXPECT_STREQ(IEL_Lib_Version(), "KALO_FXL_PE_ENG_QT13_REL_5.1__Nov 15 201315:50:20");

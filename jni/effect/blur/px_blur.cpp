@@ -46,18 +46,28 @@ size_t area(int w, int h) { return static_cast<size_t>(w) * static_cast<size_t>(
 
 
 // Sampling position of one output row or column on the reduced picture:
-// 17.15 accumulator, index masked to 11 bits, 5-bit fraction, an index at or
-// beyond the last one clamped to the last but one. A reduced side of 1 pairs
-// its only row with itself.
+// 17.15 accumulator, index masked to `bits` (11 bits, so a reduced side above
+// 2048 wraps, except for thin strips: see px_blur_thin), 5-bit fraction, an
+// index at or beyond the last one clamped to the last but one. A reduced side
+// of 1 pairs its only row with itself.
 struct Sample {
   int i0, i1, f;
 };
-Sample sample(int pos, int64_t step, int n) {
+Sample sample(int pos, int64_t step, int n, int64_t bits) {
   const int64_t a = static_cast<int64_t>(pos) * step;
-  int i = static_cast<int>((a >> 15) & 0x7FF);
+  int i = static_cast<int>((a >> 15) & bits);
   const int f = static_cast<int>((a >> 10) & 31);
   if (i >= n - 1) i = n >= 2 ? n - 2 : 0;
   return {i, i + 1 < n ? i + 1 : i, f};
+}
+
+// The index mask of the upsampling of a full-size picture.
+int64_t index_bits(int width, int height) { return px_blur_thin(width, height) ? INT32_MAX : 0x7FF; }
+
+// The reduction shift of the size table alone.
+int table_shift(int width, int height) {
+  const int m = width > height ? width : height;
+  return m > 3250 ? 4 : m > 1650 ? 3 : m > 850 ? 2 : m > 420 ? 1 : 0;
 }
 
 // 17.15 step from a full-size side to its reduced side (64-bit so that huge
@@ -159,20 +169,31 @@ void reduce_mask(unsigned char* mask, bool whole, int width, int height, const R
 int px_blur_all() { return all; }
 
 int px_blur_reduction_shift(int width, int height) {
-  const int m = width > height ? width : height;
-  int k = m > 3250 ? 4 : m > 1650 ? 3 : m > 850 ? 2 : m > 420 ? 1 : 0;
+  int k = table_shift(width, height);
   // A very thin picture is reduced less, so that no reduced side is empty.
   while (k > 0 && ((width >> k) < 1 || (height >> k) < 1)) --k;
   return k;
 }
 
+bool px_blur_thin(int width, int height) { return px_blur_reduction_shift(width, height) != table_shift(width, height); }
+
+namespace {
+// Steps of the point-sampled reduction: crossed on purpose (along a row the
+// height ratio, between rows the width ratio; equal for the reduced sizes of
+// the size table on ordinary pictures), except for a thin strip, whose sides
+// are reduced by different amounts and so take each its own ratio.
+bool reduction_steps(int width, int height, int dstWidth, int dstHeight, int* along, int* between) {
+  if (width <= 0 || height <= 0 || dstWidth <= 0 || dstHeight <= 0) return false;
+  const bool thin = px_blur_thin(width, height);
+  *along = thin ? width / dstWidth : height / dstHeight;
+  *between = thin ? height / dstHeight : width / dstWidth;
+  return *along > 0 && *between > 0 && width / dstWidth > 0;
+}
+}  // namespace
+
 void scale_down_img(const int* src, int width, int height, unsigned char* dst, int dstWidth, int dstHeight) {
-  if (!src || !dst || width <= 0 || height <= 0 || dstWidth <= 0 || dstHeight <= 0) return;
-  // Crossed on purpose: along a row the height ratio, between rows the width
-  // ratio (equal for the reduced sizes of px_blur_reduction_shift).
-  const int stepX = height / dstHeight;
-  const int stepY = width / dstWidth;
-  if (stepX <= 0 || stepY <= 0) return;
+  int stepX, stepY;
+  if (!src || !dst || !reduction_steps(width, height, dstWidth, dstHeight, &stepX, &stepY)) return;
   int count = width / (width / dstWidth);
   if (count > dstWidth) count = dstWidth;
   for (int r = 0; r < dstHeight; ++r) {
@@ -192,10 +213,8 @@ void scale_down_img(const int* src, int width, int height, unsigned char* dst, i
 
 void scale_down_depth(const unsigned char* src, int width, int height, unsigned char* dst, int dstWidth,
                       int dstHeight) {
-  if (!dst || width <= 0 || height <= 0 || dstWidth <= 0 || dstHeight <= 0) return;
-  const int stepX = height / dstHeight;
-  const int stepY = width / dstWidth;
-  if (stepX <= 0 || stepY <= 0) return;
+  int stepX, stepY;
+  if (!dst || !reduction_steps(width, height, dstWidth, dstHeight, &stepX, &stepY)) return;
   int count = width / (width / dstWidth);
   if (count > dstWidth) count = dstWidth;
   for (int r = 0; r < dstHeight; ++r) {
@@ -224,10 +243,11 @@ void run_blur(const int* src, const unsigned char* blurred, const unsigned char*
   if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
+  const int64_t bits = index_bits(width, height);
   const bool whole = all != 0;
   px_for_rows(height, [&](int y0, int y1) {
     for (int y = y0; y < y1; ++y) {
-      const Sample sy = sample(y, stepY, h);
+      const Sample sy = sample(y, stepY, h, bits);
       const size_t row = area(width, y);
       for (int x = 0; x < width; ++x) {
         const size_t i = row + x;
@@ -236,7 +256,7 @@ void run_blur(const int* src, const unsigned char* blurred, const unsigned char*
           dst[i] = src[i];
           continue;
         }
-        const Sample sx = sample(x, stepX, w);
+        const Sample sx = sample(x, stepX, w, bits);
         const size_t corner[4] = {area(w, sy.i0) + sx.i0, area(w, sy.i0) + sx.i1, area(w, sy.i1) + sx.i0,
                                   area(w, sy.i1) + sx.i1};
         int ch[3];
@@ -260,6 +280,7 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
   if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
+  const int64_t bits = index_bits(width, height);
   // Half the distance from the band's edge to the farther picture edge. A
   // band reaching that edge would make it 0 (or less): it is taken as 1, so
   // the band is sharp and any row beyond it fully blurred.
@@ -274,12 +295,12 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
       if (beyond < 0) beyond = 0;
       int64_t a64 = ((d - beyond) * k) >> 20;
       const int a = a64 < 0 ? 0 : static_cast<int>(a64);
-      const Sample sy = sample(y, stepY, h);
+      const Sample sy = sample(y, stepY, h, bits);
       const size_t row = area(width, y);
       for (int x = 0; x < width; ++x) {
         const size_t i = row + x;
         const auto s = static_cast<uint32_t>(src[i]);
-        const Sample sx = sample(x, stepX, w);
+        const Sample sx = sample(x, stepX, w, bits);
         const unsigned char* p00 = blurred + (area(w, sy.i0) + sx.i0) * 3;
         const unsigned char* p01 = blurred + (area(w, sy.i0) + sx.i1) * 3;
         const unsigned char* p10 = blurred + (area(w, sy.i1) + sx.i0) * 3;

@@ -77,8 +77,15 @@ int px_blur_outfocus(int* src, int* dst, int width, int height, int level);
 // > 420: 1, else 0; lowered while a reduced side would be 0.
 int px_blur_reduction_shift(int width, int height);
 
+// Whether the shift had to be lowered (a thin strip). A thin strip is reduced
+// with each side's own step and brought back without cutting the reduced
+// index to 11 bits; other pictures keep the crossed steps and the 11-bit
+// index, so a reduced side above 2048 (a side above 32767) wraps.
+bool px_blur_thin(int width, int height);
+
 // Point-sampled reduction of ARGB pixels into packed RGB (the step along a
-// row is the height ratio, the step between rows the width ratio).
+// row is the height ratio, the step between rows the width ratio; a thin
+// strip's steps are its own sides' ratios).
 void scale_down_img(const int* src, int width, int height, unsigned char* dst, int dstWidth, int dstHeight);
 // The same for mask bytes; a null mask counts as all 1.
 void scale_down_depth(const unsigned char* src, int width, int height, unsigned char* dst, int dstWidth,

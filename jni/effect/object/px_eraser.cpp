@@ -552,13 +552,16 @@ int select_target(Work& w) {
 }
 
 // Waits while a stop request is pending; false when an exit request came.
+// Every turn of the wait marks the pause again, so a status written from
+// outside meanwhile (setEraserStatus) cannot leave a paused run where
+// reStartEraser and exitEraser refuse it; a running round likewise marks
+// itself running again.
 bool honour_requests() {
-  if (g_bExit.load()) return false;
-  if (g_bStop.load()) {
+  while (g_bStop.load() && !g_bExit.load()) {
     g_status_photoeraser.store(PX_ERASER_PAUSED);
-    while (g_bStop.load() && !g_bExit.load()) std::this_thread::sleep_for(std::chrono::microseconds(500));
-    if (g_bExit.load()) return false;
+    std::this_thread::sleep_for(std::chrono::microseconds(200));
   }
+  if (g_bExit.load()) return false;
   g_status_photoeraser.store(PX_ERASER_RUNNING);
   return true;
 }

@@ -13,15 +13,24 @@ struct Block {
 };
 Block g_saved[2];
 
-int span(int lo, int hi) { return hi < lo ? 0 : hi - lo + 1; }
+// Elements a row and rows of a rectangle: none at all when it is empty on
+// either axis (so an empty rectangle never walks its rows).
+void extent(px_rect r, int* w, int* h) {
+  if (px_rect_empty(r)) {
+    *w = *h = 0;
+    return;
+  }
+  *w = r.right - r.left + 1;
+  *h = r.bottom - r.top + 1;
+}
 }  // namespace
 
 int px_store_region(px_stored_kind kind, const void* source, int element_size, int width, px_rect rect) {
   Block& b = g_saved[kind];
   px_free(b.data);
   b = Block{};
-  const int w = span(rect.left, rect.right);
-  const int h = span(rect.top, rect.bottom);
+  int w, h;
+  extent(rect, &w, &h);
   const size_t row = static_cast<size_t>(w) * element_size;
   // At least one byte, so an empty region still counts as saved.
   b.data = static_cast<unsigned char*>(px_malloc(row * h + 1, 1));
@@ -41,7 +50,8 @@ int px_recover_region(px_stored_kind kind, void* target, int element_size, int w
   const Block& b = g_saved[kind];
   if (!b.data) return -1;
   if (b.element_size != element_size && b.width * b.height > 0) return -1;
-  int w = span(rect.left, rect.right), h = span(rect.top, rect.bottom);
+  int w, h;
+  extent(rect, &w, &h);
   if (w > b.width) w = b.width;
   if (h > b.height) h = b.height;
   auto* dst = static_cast<unsigned char*>(target);

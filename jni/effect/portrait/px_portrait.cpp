@@ -47,14 +47,16 @@ void release(FaceEngineInfo* fe) {
   px_free(fe);
 }
 
-// Nearest-neighbour reduction with the Q12 step of the photo width.
+// Nearest-neighbour reduction with the Q12 step of the photo width. The step
+// is held in 64 bits: a photo side of 2^19 or more over a one-pixel preview
+// gives a step past the int range.
 void reduce(const int* full, int width, int height, int* dst, int pw, int ph) {
-  const int step = static_cast<int>(static_cast<float>(static_cast<int64_t>(width) << 12) / pw);
+  const int64_t step = static_cast<int64_t>(static_cast<float>(static_cast<int64_t>(width) << 12) / static_cast<float>(pw));
   for (int j = 0; j < ph; ++j) {
-    const int64_t sy = (static_cast<int64_t>(j) * step) >> 12;
+    const int64_t sy = (j * step) >> 12;
     if (sy >= height) break;
     for (int i = 0; i < pw; ++i) {
-      const int64_t sx = (static_cast<int64_t>(i) * step) >> 12;
+      const int64_t sx = (i * step) >> 12;
       if (sx >= width) break;
       dst[static_cast<size_t>(j) * pw + i] = full[static_cast<size_t>(sy) * width + sx];
     }

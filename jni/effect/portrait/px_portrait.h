@@ -5,7 +5,8 @@
 // Results: 40960 success, 40961 memory ran out, 40962 a null picture, a
 // level out of range or no open session, 40971 the out-focus blur failed.
 //
-// Previews: one Q12 step, step = (int)((float)(width << 12) / previewWidth),
+// Previews: one Q12 step, step = (float)(width << 12) / previewWidth truncated
+// (held in 64 bits, so huge photo sides over tiny previews cannot wrap),
 // serves both axes; preview pixel (i, j) takes photo pixel
 // (i * step >> 12, j * step >> 12), and preview pixels whose source lies
 // outside the photo are left as they were.

@@ -186,7 +186,8 @@ int px_remove_redeye_manual_with_preview(int* src, int width, int height, int* d
                                          int previewHeight, int x, int y, int radius) {
   if (!src || !dst || width < 1 || height < 1 || previewWidth < 1 || previewHeight < 1) return 0;
   const int result = px_remove_redeye_manual(src, width, height, x, y, radius);
-  const int f = static_cast<int>(static_cast<float>(static_cast<long long>(previewWidth) << 12) / width);
+  const long long f =
+      static_cast<long long>(static_cast<float>(static_cast<long long>(previewWidth) << 12) / static_cast<float>(width));
   if (f <= 0) return result;
   for (int j = 0; j < previewHeight; ++j) {
     const long long sy = (static_cast<long long>(j) << 12) / f;

@@ -19,7 +19,7 @@ int px_remove_redeye_manual_prev(const int* src, int* dst, int width, int height
 // The full correction of `src` in place, then the whole preview
 // (previewWidth x previewHeight) refreshed from it by nearest neighbour:
 // preview pixel (i, j) takes photo pixel ((i << 12) / f, (j << 12) / f) with
-// the Q12 factor f = (int)((float)(previewWidth << 12) / width); preview
+// the Q12 factor f = (float)(previewWidth << 12) / width truncated (64-bit); preview
 // pixels whose source lies outside the photo are left as they were. Returns
 // the full form's result.
 int px_remove_redeye_manual_with_preview(int* src, int width, int height, int* dst, int previewWidth,

@@ -160,9 +160,10 @@ void IEL_DeInit_Effect(void** handle) {
 }
 
 unsigned int IEL_GetProgress() {
-  uint32_t total = iel_progress::total.load(std::memory_order_relaxed);
+  const uint32_t total = iel_progress::total.load(std::memory_order_acquire);
   if (total == 0) return 0;  // asked before an effect set its total
-  return iel_progress::done.load(std::memory_order_relaxed) * 100u / total;
+  const uint64_t percent = static_cast<uint64_t>(iel_progress::done.load(std::memory_order_relaxed)) * 100u / total;
+  return percent > 100 ? 100u : static_cast<unsigned int>(percent);
 }
 
 void IEL_CancelOperation() {

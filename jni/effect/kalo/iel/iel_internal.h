@@ -53,8 +53,12 @@ class IELProgressScope {
   IELProgressScope(const IELProgressScope&) = delete;
   IELProgressScope& operator=(const IELProgressScope&) = delete;
 
+  // The done count is cleared before the new total is published, so a
+  // reader that sees the new total never pairs it with the last effect's
+  // count (IEL_GetProgress reads the total first, with acquire order).
   void start(uint32_t total_units, uint32_t done_units = 0) {
-    iel_progress::total.store(total_units, std::memory_order_relaxed);
+    iel_progress::done.store(0, std::memory_order_relaxed);
+    iel_progress::total.store(total_units, std::memory_order_release);
     iel_progress::done.store(done_units, std::memory_order_relaxed);
   }
   void advance(uint32_t units = 1) { iel_progress::done.fetch_add(units, std::memory_order_relaxed); }
