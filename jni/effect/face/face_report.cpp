@@ -1,15 +1,20 @@
 #include "face_report.h"
 
 #include "face_engine.h"
+#include "../kalo/px_mem.h"
 
 int px_analyze_faces(const int* argb, int width, int height, int mode, int maxFace, int* report) {
   if (maxFace < 1) return 0;
   FaceEngineInfo info{};
-  if (!InitFaceBeautyPlus(&info, mode, maxFace, 1, 0, 0, 0)) {
+  // Memory short anywhere (the record's arrays, or a detector's buffers, which
+  // the detectors skip quietly as "no face") fails the analysis.
+  const long failures = px_mem_failures();
+  const bool ready = InitFaceBeautyPlus(&info, mode, maxFace, 1, 0, 0, 0) && px_mem_failures() == failures;
+  if (ready) RunFaceAnalyzer(&info, argb, width, height);
+  if (!ready || px_mem_failures() != failures) {
     ReleaseFaceBeautyPlus(&info);
     return -1;
   }
-  RunFaceAnalyzer(&info, argb, width, height);
   const int n = info.faceCount < maxFace ? info.faceCount : maxFace;
   for (int i = 0; i < n; ++i) {
     int* r = report + i * PX_FACE_REPORT_INTS;

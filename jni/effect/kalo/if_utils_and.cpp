@@ -1,5 +1,7 @@
 #include "if_utils_and.h"
 
+#include "px_mem.h"
+
 #include <sys/time.h>
 
 #include <cstdarg>
@@ -8,17 +10,22 @@
 #include <cstring>
 
 void* if_malloc(int size, const char*, int) {
-  if (size < 1) return nullptr;
-  return std::malloc(static_cast<size_t>(size));
+  if (size < 1 || px_mem_take_failure()) return nullptr;
+  void* p = std::malloc(static_cast<size_t>(size));
+  px_mem_count(p, 1);
+  return p;
 }
 
 void* if_calloc(int size, int count, const char*, int) {
-  if (count <= 0 || size <= 0) return nullptr;
-  return std::calloc(static_cast<size_t>(count), static_cast<size_t>(size));
+  if (count <= 0 || size <= 0 || px_mem_take_failure()) return nullptr;
+  void* p = std::calloc(static_cast<size_t>(count), static_cast<size_t>(size));
+  px_mem_count(p, 1);
+  return p;
 }
 
 void if_free(void* p, const char*, int) {
-  if (p) std::free(p);
+  px_mem_count(p, -1);
+  std::free(p);
 }
 
 void* if_memset(void* d, int value, int n) {

@@ -1,5 +1,8 @@
-// Memory wrappers of the engine operations and the bridge: plain forwards to
-// the C library, so an allocation failure is seen as a null result.
+// Memory wrappers of the engine operations and the bridge: forwards to the C
+// library, so an allocation failure is seen as a null result. A test hook can
+// make one chosen allocation fail, and the wrappers count the blocks they
+// hand out and take back, so tests can see that a failed call frees what it
+// took.
 #pragma once
 
 #include <cstddef>
@@ -10,3 +13,23 @@ void* px_realloc(void* p, size_t size);
 void px_free(void* p);
 void* px_memset(void* d, int value, size_t n);
 void* px_memcpy(void* d, const void* s, size_t n);
+
+// ---- test hooks (px_ and if_ allocations alike) -------------------------------
+
+// The n-th allocation from now (1: the next one) returns null; the others go
+// through. 0 or less turns the hook off.
+void px_mem_fail_nth(long n);
+// Whether the hook is still waiting for its allocation (it had fewer than n).
+bool px_mem_fail_pending();
+// Blocks handed out and not yet freed, by every wrapper since the start.
+long px_mem_live_blocks();
+// Allocations that came back null (from the hook or the C library) since the
+// start: an operation whose parts give up quietly on a missing buffer (the
+// face detectors) compares it before and after to report the failure.
+long px_mem_failures();
+
+// For the if_ wrappers: whether this allocation is the one to fail, and the
+// bookkeeping of a block handed out (delta 1, a null block counted as a
+// failure) or freed (delta -1).
+bool px_mem_take_failure();
+void px_mem_count(const void* block, int delta);

@@ -27,18 +27,23 @@ bool usable(const int* a, const int* b, int width, int height) { return a && b &
 
 // A record initialised from the current settings and run on the photo; null
 // when memory ran out.
+// A new analysed record, or null when memory ran short anywhere in it (the
+// record's own arrays, or a detector's buffers, which the detectors would
+// otherwise skip quietly as "no face").
 FaceEngineInfo* analyse(const int* argb, int width, int height) {
   caIF_SetBeautifier(Face_BeautifierRGB);
+  const long failures = px_mem_failures();
   auto* fe = static_cast<FaceEngineInfo*>(px_calloc(1, sizeof(FaceEngineInfo)));
   if (!fe) return nullptr;
   const int mode = (g_detectOption >= 2 && g_detectOption <= 4) ? g_detectOption : 1;
-  if (!InitFaceBeautyPlus(fe, mode, g_maxFaceCnt, kPrecision, kBeautyModeSkin, g_beautyLevel, 0)) {
-    ReleaseFaceBeautyPlus(fe);
-    px_free(fe);
-    return nullptr;
+  if (InitFaceBeautyPlus(fe, mode, g_maxFaceCnt, kPrecision, kBeautyModeSkin, g_beautyLevel, 0) &&
+      px_mem_failures() == failures) {
+    RunFaceAnalyzer(fe, argb, width, height);
+    if (px_mem_failures() == failures) return fe;
   }
-  RunFaceAnalyzer(fe, argb, width, height);
-  return fe;
+  ReleaseFaceBeautyPlus(fe);
+  px_free(fe);
+  return nullptr;
 }
 
 void release(FaceEngineInfo* fe) {
@@ -71,6 +76,11 @@ int* copy_of(const int* src, int width, int height) {
 
 bool face_index_ok(int faceIndex) { return faceIndex >= 0 && faceIndex < g_FE->faceCount; }
 
+// Whether every allocation since the failure count was `failures` went
+// through: the beautifier and the out-focus blur skip their work quietly
+// when their memory runs short, and the operations report it as ERR_ALLOC.
+bool memory_held(long failures) { return px_mem_failures() == failures; }
+
 // Beautifies all faces (faceIndex < 0) or one in `image`.
 void beautify(int* image, int width, int height, int faceIndex) {
   caIF_SetBeautifier(Face_BeautifierRGB);
@@ -84,9 +94,10 @@ int apply_beautifier(const int* src, int* dst, int width, int height, int level,
   if (level < 1 || level > 5 || !g_FE) return PX_ERR_NULL;
   g_FE->beautyLevel = level;
   if (g_FE->faceCount < 1 || (single && !face_index_ok(faceIndex))) return PX_OK;
+  const long failures = px_mem_failures();
   std::memcpy(dst, src, pixels(width, height) * sizeof(int));
   beautify(dst, width, height, single ? faceIndex : -1);
-  return PX_OK;
+  return memory_held(failures) ? PX_OK : PX_ERR_ALLOC;
 }
 
 int beautifier_preview(const int* src, int width, int height, int* dst, int pw, int ph, int level, int faceIndex,
@@ -99,12 +110,14 @@ int beautifier_preview(const int* src, int width, int height, int* dst, int pw, 
   if (level < 1 || level > 5 || !g_FE) return PX_ERR_NULL;
   g_FE->beautyLevel = level;
   if (g_FE->faceCount < 1 || (single && !face_index_ok(faceIndex))) return PX_OK;
+  const long failures = px_mem_failures();
   int* scratch = copy_of(src, width, height);
   if (!scratch) return PX_ERR_ALLOC;
   beautify(scratch, width, height, single ? faceIndex : -1);
-  reduce(scratch, width, height, dst, pw, ph);
+  const bool held = memory_held(failures);
+  if (held) reduce(scratch, width, height, dst, pw, ph);
   px_free(scratch);
-  return PX_OK;
+  return held ? PX_OK : PX_ERR_ALLOC;
 }
 
 // Lighting of all faces (faceIndex < 0) or one, in place.
@@ -228,6 +241,7 @@ int px_facebeauty(const int* src, int* dst, int width, int height) {
   std::memcpy(dst, src, n * sizeof(int));
   FaceEngineInfo* fe = analyse(dst, width, height);
   if (!fe) return PX_ERR_ALLOC;
+  const long failures = px_mem_failures();
   if (fe->faceCount > 0) {
     RunFaceBeautyPlus(fe, dst, width, height);
   } else {
@@ -243,7 +257,7 @@ int px_facebeauty(const int* src, int* dst, int width, int height) {
     }
   }
   release(fe);
-  return PX_OK;
+  return memory_held(failures) ? PX_OK : PX_ERR_ALLOC;
 }
 
 // ---- lighting ------------------------------------------------------------------------
@@ -345,11 +359,13 @@ int px_control_outfocusing_in_portrait_preview(const int* src, int width, int he
   if (!usable(src, dst, width, height) || previewWidth < 1 || previewHeight < 1 || !g_FE) return PX_ERR_NULL;
   if (strength < 0) return PX_ERR_EFFECT;
   const size_t n = pixels(width, height);
+  const long failures = px_mem_failures();
   int* blurred = static_cast<int*>(px_malloc(n, sizeof(int)));
   int rc = PX_ERR_ALLOC;
   if (blurred) {
     // The out-focus blur only reads its input.
     rc = px_blur_outfocus(const_cast<int*>(src), blurred, width, height, strength) == 0 ? PX_OK : PX_ERR_EFFECT;
+    if (rc == PX_OK && !memory_held(failures)) rc = PX_ERR_ALLOC;  // nothing was blurred
     // Compose in place over the blurred copy, then reduce.
     if (rc == PX_OK) rc = outfocus_compose_faces(src, blurred, blurred, width, height);
     if (rc == PX_OK) reduce(blurred, width, height, dst, previewWidth, previewHeight);

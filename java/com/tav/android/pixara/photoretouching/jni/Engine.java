@@ -344,7 +344,11 @@ public final class Engine {
     /** Vintage: a warm, faded film look; alpha kept. Refused arguments leave the output untouched. */
     public static native void applyVintage(int[] in, int[] out, int width, int height);
 
-    /** Percentage done of the effect running on another thread (posterize, sepia, sketch blur). */
+    /**
+     * Percentage done, 0..100, of the effect running on another thread
+     * (posterize, sepia, sketch blur); a read that races the start of the next
+     * effect reports at most 100.
+     */
     public static native int getEffectProgress();
 
     /** Asks the effect running on another thread to stop; ignored when none runs. */
@@ -719,6 +723,20 @@ public final class Engine {
     // the previews use it, destroyBlur / destroyTiltShift free it. A preview
     // without a kept state writes nothing; destroying twice is harmless. The
     // apply methods never use the kept buffers. The caller owns every array.
+    //
+    // Sampling on unusual shapes. The reduction samples a row with the
+    // height's step and the rows with the width's step; the two are equal on
+    // ordinary pictures but not where the short side is only a few times the
+    // reduction factor (4000 x 40 samples its rows 20 pixels apart for a
+    // 16-pixel reduction), so such pictures come back slightly stretched.
+    // The reduced picture is read back with an 11-bit index, so a side above
+    // 32767 pixels wraps onto the start of the reduced picture. Both are kept
+    // as the blur has always computed them. A thin strip whose short side the
+    // reduction would empty (below 2, 4, 8 or 16 pixels) is reduced less, with
+    // each side's own step and a full index, and keeps its place at any length.
+    // In tilt-shift, the sharp band's weight is 2^20 / D truncated times 256
+    // (D half the distance from the band to the farther edge), so on pictures
+    // of more than about 100,000 rows the band itself takes some blur.
 
     /**
      * Starts a selective-blur session: keeps the reduced picture and mask for
@@ -813,6 +831,9 @@ public final class Engine {
      * committed to {@code image}, so another thread may show the progress.
      * While it runs, another thread may call {@link #stopEraser},
      * {@link #reStartEraser}, {@link #exitEraser} and {@link #getEraserStatus}.
+     * The rectangle is first widened to even left and top and odd right and
+     * bottom bounds (within the picture), so selected pixels one row or column
+     * outside the caller's rectangle may be filled too.
      *
      * @return SUCCESS when done, ERR_ERASER_BUSY when a run is already going on
      *     (nothing touched) or when {@link #exitEraser} ended this run early (the
@@ -821,7 +842,13 @@ public final class Engine {
      */
     public static native int runEraser(int[] image, byte[] mask, int width, int height, Rect rect);
 
-    /** Overwrites the eraser status word (ERASER_IDLE, ERASER_PAUSED, ERASER_RUNNING). */
+    /**
+     * Overwrites the eraser status word (ERASER_IDLE, ERASER_PAUSED,
+     * ERASER_RUNNING). A run going on marks its own status again at its next
+     * round (a paused run on every turn of its wait), so an overwrite never
+     * leaves a running or paused eraser beyond the reach of
+     * {@link #reStartEraser} and {@link #exitEraser}.
+     */
     public static native void setEraserStatus(int status);
 
     /** The eraser status word: ERASER_IDLE, ERASER_RUNNING or ERASER_PAUSED. */
@@ -1018,7 +1045,9 @@ public final class Engine {
      *
      * @param level 0 (out untouched), 1 light .. 5 strongest
      * @return SUCCESS (out untouched when the session has no face); ERR_NULL
-     *         for a level outside 0..5, no session or refused arguments
+     *         for a level outside 0..5, no session or refused arguments;
+     *         ERR_ALLOC when memory ran short while smoothing (out then holds
+     *         the photo with the faces smoothed before that)
      */
     public static native int runBeautyInPortrait(int[] in, int[] out, int width, int height, int level);
 
@@ -1142,16 +1171,31 @@ public final class Engine {
 
     // ---- saved regions ----------------------------------------------------
 
-    /** Saves the rectangle of the mask (row length width), replacing the saved mask. Returns 0. */
+    // Unlike the region methods, the saved-region methods take an empty
+    // rectangle (right < left or top > bottom) as an empty region, not as the
+    // whole picture: storing it saves an empty region (a saved state that holds
+    // nothing), and recovering into it, or recovering an empty region, writes
+    // nothing and returns 0. A rectangle reaching outside the picture is
+    // clipped to it; one wholly outside is refused with ERR_NULL.
+
+    /**
+     * Saves the rectangle of the mask (row length width), replacing the saved
+     * mask; an empty rectangle saves an empty region. Returns 0, ERR_NULL for
+     * refused arguments (the saved mask stays) or ERR_ALLOC.
+     */
     public static native int storeMask(byte[] mask, int width, int height, Rect rect);
 
-    /** Saves the rectangle of the picture, replacing the saved object. Returns 0. */
+    /** Saves the rectangle of the picture, replacing the saved object; as {@link #storeMask}. */
     public static native int storeObject(int[] image, int width, int height, Rect rect);
 
-    /** Copies the saved mask back into the rectangle; -1 when none is saved. */
+    /**
+     * Copies the saved mask back into the rectangle, at most the saved
+     * region's width and height from its top-left corner; -1 when none is
+     * saved; nothing for an empty rectangle.
+     */
     public static native int recoverMask(byte[] mask, int width, int height, Rect rect);
 
-    /** Copies the saved object back into the rectangle; -1 when none is saved. */
+    /** Copies the saved object back into the rectangle; as {@link #recoverMask}. */
     public static native int recoverObject(int[] image, int width, int height, Rect rect);
 
     /** Frees the saved mask. */
