@@ -107,12 +107,13 @@ void blur_line(const unsigned char* src, unsigned char* dst, const unsigned char
   }
 }
 
-// Horizontal pass into a scratch buffer, then vertical pass into dst.
+// Horizontal pass into a scratch buffer (the one given, or one of its own),
+// then vertical pass into dst.
 template <bool kMasked>
 bool separable_blur(const unsigned char* src, unsigned char* dst, const unsigned char* mask, int w, int h,
-                    Taps taps) {
+                    Taps taps, unsigned char* scratch = nullptr) {
   if (!src || !dst || w <= 0 || h <= 0) return false;
-  auto* tmp = static_cast<unsigned char*>(px_malloc(area(w, h), 3));
+  auto* tmp = scratch ? scratch : static_cast<unsigned char*>(px_malloc(area(w, h), 3));
   if (!tmp) return false;
   for (int y = 0; y < h; ++y) {
     const size_t row = area(w, y);
@@ -122,7 +123,7 @@ bool separable_blur(const unsigned char* src, unsigned char* dst, const unsigned
     blur_line<kMasked>(tmp + static_cast<size_t>(x) * 3, dst + static_cast<size_t>(x) * 3,
                        kMasked ? mask + x : nullptr, h, w, taps);
   }
-  px_free(tmp);
+  if (tmp != scratch) px_free(tmp);
   return true;
 }
 
@@ -394,23 +395,40 @@ void px_tiltshift_preview(const int* src, int* dst, int width, int height, int c
   restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);
 }
 
-int px_apply_tiltshift(const int* src, int* dst, int width, int height, int center, int halfBand) {
+namespace {
+// Tilt-shift with every buffer taken before the picture is read or written,
+// so that a shortage of memory leaves dst as it was. `before(dst)` runs once
+// the buffers are held (the miniature's saturation).
+template <class Before>
+int tiltshift(const int* src, int* dst, int width, int height, int center, int halfBand, Before before) {
   if (!src || !dst || width <= 0 || height <= 0) return PX_ERR_NULL;
   Reduced r;
   if (!allocate(r, width, height, false)) return PX_ERR_ALLOC;
+  auto* scratch = static_cast<unsigned char*>(px_malloc(area(r.w, r.h), 3));
+  if (!scratch) {
+    r.release();
+    return PX_ERR_ALLOC;
+  }
+  before();
   scale_down_img(src, width, height, r.pic, r.w, r.h);
-  const bool blurred = make_tiltshift(r.pic, r.blurred, r.w, r.h);
+  separable_blur<false>(r.pic, r.blurred, nullptr, r.w, r.h, Taps{-4, 5}, scratch);
+  px_free(scratch);
   px_free(r.pic);
   r.pic = nullptr;
-  if (blurred) restore_tiltshift(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand);
+  restore_tiltshift(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand);
   r.release();
-  return blurred ? PX_OK : PX_ERR_ALLOC;
+  return PX_OK;
+}
+}  // namespace
+
+int px_apply_tiltshift(const int* src, int* dst, int width, int height, int center, int halfBand) {
+  return tiltshift(src, dst, width, height, center, halfBand, [] {});
 }
 
 int px_apply_miniature(const int* src, int* dst, int width, int height) {
   if (!src || !dst || width <= 0 || height <= 0) return PX_ERR_NULL;
-  px_control_saturation_all(const_cast<int*>(src), dst, width, height, 16);
-  return px_apply_tiltshift(dst, dst, width, height, height >> 1, height >> 3);
+  return tiltshift(dst, dst, width, height, height >> 1, height >> 3,
+                   [&] { px_control_saturation_all(const_cast<int*>(src), dst, width, height, 16); });
 }
 
 void px_destroy_tiltshift() {

@@ -238,9 +238,11 @@ const unsigned char kFallbackBrighten[256] = {
 int px_facebeauty(const int* src, int* dst, int width, int height) {
   if (!usable(src, dst, width, height)) return PX_ERR_NULL;
   const size_t n = pixels(width, height);
-  std::memcpy(dst, src, n * sizeof(int));
-  FaceEngineInfo* fe = analyse(dst, width, height);
+  // The photo is analysed before it is copied, so that a shortage of memory
+  // leaves dst as it was.
+  FaceEngineInfo* fe = analyse(src, width, height);
   if (!fe) return PX_ERR_ALLOC;
+  std::memcpy(dst, src, n * sizeof(int));
   const long failures = px_mem_failures();
   if (fe->faceCount > 0) {
     RunFaceBeautyPlus(fe, dst, width, height);

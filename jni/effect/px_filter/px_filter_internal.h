@@ -29,13 +29,18 @@ bool partial(const char* func, int* out, const unsigned char* mask, int width, i
     if_error_msg(func, __LINE__, "Low memory: %s\n", func);
     return false;
   }
+  // A whole-picture form that ran short of memory has logged it and written
+  // nothing: nothing is merged either.
+  const long failures = px_mem_failures();
+  bool done = true;
   if constexpr (std::is_same_v<decltype(whole(scratch)), bool>) {
-    if (!whole(scratch)) {
-      px_free(scratch);
-      return false;
-    }
+    done = whole(scratch);
   } else {
     whole(scratch);
+  }
+  if (!done || px_mem_failures() != failures) {
+    px_free(scratch);
+    return false;
   }
   px_merge_selected(scratch, out, mask, width, height, px_rect{left, right, top, bottom});
   px_free(scratch);
