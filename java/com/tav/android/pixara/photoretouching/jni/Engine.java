@@ -1206,4 +1206,125 @@ public final class Engine {
 
     /** The effect library's version text. */
     public static native String LibVersion();
+
+    // ---- selection tools: edge-snapping lasso, tap-to-select, refine ----
+    //
+    // The lasso is a session: selectionStart keeps a copy of the picture and
+    // computes its edge cost once; each tap adds a point, and between two
+    // consecutive points the outline follows the strongest edges (the cheapest
+    // path over the edge cost within a band around the straight segment).
+    // Outline coordinates are pixel corners: corner (x, y) is the top-left
+    // corner of pixel (x, y), corners run 0..width and 0..height, and the
+    // outline runs along pixel edges, so a closed outline selects whole pixels.
+    // A tap is snapped to the strongest edge corner within 3 pixels. Points to
+    // remove or move are found within 10 pixels of where they were tapped or
+    // snapped to. Pictures above 1.1 megapixels are searched on a reduced copy
+    // first and refined at full size near that path. A refused call (no
+    // session, a point outside the picture: ERR_NULL; no point there:
+    // ERR_NO_POINT) or one that ran short of memory (ERR_ALLOC) changes
+    // nothing. The session lives until selectionFinish or the next
+    // selectionStart; callers must not use it from two threads at once.
+
+    /** A linked point to be removed or moved was not found (the list is empty or no point is near). */
+    public static final int ERR_NO_POINT = 40968;
+    /** {@link #selectTap} mode: the tapped region replaces the selection. */
+    public static final int SELECT_REPLACE = 0;
+    /** {@link #selectTap} mode: the tapped region is added to the selection. */
+    public static final int SELECT_ADD = 1;
+    /** {@link #selectTap} mode: the tapped region is taken out of the selection. */
+    public static final int SELECT_SUBTRACT = 2;
+
+    /**
+     * Starts a lasso selection on a picture, ending any earlier one. SUCCESS,
+     * ERR_NULL (null or short array, bad size), or ERR_ALLOC (no session is
+     * left then).
+     */
+    public static native int selectionStart(int[] image, int width, int height);
+
+    /**
+     * Appends the point tapped at pixel (x, y) and joins it to the previous
+     * point along the picture's edges. Returns the new outline segment's
+     * length in steps (0 for the first point; always below 40960), or
+     * ERR_NULL (no session, or the point is outside the picture) or ERR_ALLOC.
+     */
+    public static native int selectionAddPoint(int x, int y);
+
+    /**
+     * Removes the point nearest (x, y) within 10 pixels and joins its two
+     * neighbours by a new path. SUCCESS, ERR_NO_POINT (the list is empty or no
+     * point is that near), ERR_NULL (no session, (x, y) outside the picture),
+     * ERR_ALLOC.
+     */
+    public static native int selectionRemovePoint(int x, int y);
+
+    /**
+     * Moves the point nearest (x, y) within 10 pixels to (toX, toY), snapping
+     * it again and recomputing the segments on both sides. Codes as for
+     * {@link #selectionRemovePoint}; ERR_NULL also for a destination outside
+     * the picture.
+     */
+    public static native int selectionMovePoint(int x, int y, int toX, int toY);
+
+    /** The number of points in the list (0 without a session). */
+    public static native int selectionPointCount();
+
+    /** The number of corners in the open outline (0 without a session or points). */
+    public static native int selectionOutlineLength();
+
+    /**
+     * Writes the open outline (the first point, then the path to each later
+     * point, in order) as x, y pairs of corner coordinates into {@code xy},
+     * which must hold 2 * {@link #selectionOutlineLength()} ints. SUCCESS, or
+     * ERR_NULL (no session, null or short array).
+     */
+    public static native int selectionGetOutline(int[] xy);
+
+    /**
+     * Closes the outline with a path from the last point back to the first
+     * and writes the selection into {@code mask} (width * height bytes of the
+     * session's picture size): 1 inside, 0 outside (non-zero winding for an
+     * outline that crosses itself). {@code bounds} receives the bounding
+     * rectangle of the selected pixels, or the empty rectangle (0, -1, 0, -1)
+     * when none is; note that an empty rectangle means the whole picture to
+     * the region methods. The session stays open, so points can still be
+     * moved and the outline closed again. SUCCESS, ERR_NULL (no session,
+     * fewer than 3 points, another size, null or short mask), ERR_ALLOC.
+     */
+    public static native int selectionClose(byte[] mask, int width, int height, Rect bounds);
+
+    /** Ends the lasso session and frees its state. Always SUCCESS. */
+    public static native int selectionFinish();
+
+    /**
+     * Tap-to-select: the 4-connected region of similar colour around pixel
+     * (x, y), combined with {@code mask} by {@code mode} ({@link #SELECT_REPLACE},
+     * {@link #SELECT_ADD}, {@link #SELECT_SUBTRACT}). With tolerance t in
+     * 0..100 (clamped) a neighbour joins when its summed |dR| + |dG| + |dB| to
+     * the pixel it is reached from is below 1 + (38 t + 50) / 100 (20 at 50,
+     * the eraser's segmentation step; 1 at 0: equal colours only) and its
+     * summed difference to the tapped pixel is below six times that. The
+     * mask comes back as 1 and 0 (other byte values count as unselected);
+     * {@code bounds} receives the bounding rectangle of the result. SUCCESS,
+     * ERR_NULL (null or short arrays, a point outside, a bad mode; nothing is
+     * written), ERR_ALLOC (the mask is unchanged).
+     */
+    public static native int selectTap(int[] image, byte[] mask, int width, int height, int x, int y, int tolerance,
+            int mode, Rect bounds);
+
+    /**
+     * Grows the selection by {@code pixels} (every pixel within that
+     * Euclidean distance of a selected one) or, for a negative value, shrinks
+     * it (a pixel stays when no unselected pixel lies within the distance;
+     * the picture's border does not shrink it). 0 only turns the mask into 1
+     * and 0. {@code bounds} receives the result's bounding rectangle.
+     * SUCCESS, ERR_NULL, ERR_ALLOC (the mask is unchanged).
+     */
+    public static native int selectGrow(byte[] mask, int width, int height, int pixels, Rect bounds);
+
+    /**
+     * Fills the holes of a selection: every unselected 4-connected region that
+     * does not reach the picture's border becomes selected. {@code bounds}
+     * receives the result's bounding rectangle. SUCCESS, ERR_NULL, ERR_ALLOC.
+     */
+    public static native int selectFillHoles(byte[] mask, int width, int height, Rect bounds);
 }

@@ -506,6 +506,7 @@ public final class StatefulFuzz {
         Engine.deleteStoredObject();
         Engine.setEraserStatus(Engine.ERASER_IDLE);
         Engine.setFacebeauty(2, 3, 3);
+        Engine.selectionFinish();
     }
 
     /**
