@@ -62,7 +62,13 @@ final class Demo {
                 op.action().apply(job);
                 File result = new File(outDir, base + "-" + op.name() + ".png");
                 Picture.write(job.result(), job.resultWidth(), job.resultHeight(), result);
-                cell(g, Picture.image(job.result(), job.resultWidth(), job.resultHeight()), (col % COLUMNS) * THUMB,
+                if (job.preview != null) {
+                    // The selection tools show their overlay; the mask is written as well.
+                    Picture.write(job.preview, job.width, job.height, new File(outDir, base + "-" + op.name()
+                            + "-overlay.png"));
+                }
+                int[] shown = job.preview != null ? job.preview : job.result();
+                cell(g, Picture.image(shown, job.resultWidth(), job.resultHeight()), (col % COLUMNS) * THUMB,
                         top + (col / COLUMNS) * (THUMB + LABEL), op.name());
                 col++;
             }

@@ -92,6 +92,7 @@ public final class Glimmer {
         Map<String, Integer> values = op.defaults(false);
         int[] rect = null;
         File maskFile = null;
+        int[] points = null;
         for (int i = 1; i < args.length - 2; i++) {
             String a = args[i];
             int eq = a.indexOf('=');
@@ -108,6 +109,10 @@ public final class Glimmer {
                 maskFile = new File(value);
                 continue;
             }
+            if (name.equals("points") && SelectionOperations.takesPoints(op)) {
+                points = SelectionOperations.parsePoints(value);
+                continue;
+            }
             Param p = op.param(name);
             if (p == null) {
                 throw new UsageException(op.name() + " has no parameter '" + name + "'");
@@ -118,9 +123,15 @@ public final class Glimmer {
         File outFile = new File(args[args.length - 1]);
         Picture pic = Picture.read(in);
         Job job = maskFile == null ? pic.job(values, rect) : maskJob(pic, values, rect, maskFile);
+        job.points = points;
         op.action().apply(job);
         Picture.write(job.result(), job.resultWidth(), job.resultHeight(), outFile);
         out.println("wrote " + outFile);
+        if (job.preview != null) {
+            File previewFile = new File(outFile.getPath().replaceFirst("(\\.png)?$", "-overlay.png"));
+            Picture.write(job.preview, job.width, job.height, previewFile);
+            out.println("wrote " + previewFile);
+        }
     }
 
     static int parseValue(Param p, String value) throws UsageException {

@@ -48,6 +48,11 @@ public final class Operations {
         private int resultWidth;
         private int resultHeight;
 
+        /** Tap positions x1, y1, x2, y2, ... given as points= (the selection operations), or null. */
+        public int[] points;
+        /** A preview picture of the input's size that the command line writes beside the result, or null. */
+        public int[] preview;
+
         /**
          * Sets the picture the operation produced when its size differs from
          * the input's (a turn, crop or mirror); {@code pixels} holds at least
@@ -195,6 +200,9 @@ public final class Operations {
 
         // backlight
         ops.addAll(BacklightOperations.list());
+
+        // selection tools
+        ops.addAll(SelectionOperations.list());
 
         ALL = Collections.unmodifiableList(ops);
     }
