@@ -212,8 +212,9 @@ TEST(SelectionLasso, TwoScalesOnALargePictureStillFollowTheEdge) {
   ASSERT_EQ(PX_OK, px_selection_start(p.data(), w, h));
   for (int k = 0; k < 10; ++k) {
     const double a = k * 2 * 3.14159265358979 / 10 + 0.2;
-    ASSERT_GE(px_selection_add_point(static_cast<int>(cx + (r + 2) * std::cos(a)),
-                                     static_cast<int>(cy + (r - 2) * std::sin(a))),
+    // Taps a pixel outside the circle, rounded: within the snap radius of the edge.
+    ASSERT_GE(px_selection_add_point(static_cast<int>(std::lround(cx + (r + 1) * std::cos(a))),
+                                     static_cast<int>(std::lround(cy + (r + 1) * std::sin(a)))),
               0);
   }
   std::vector<int> xy = outline();

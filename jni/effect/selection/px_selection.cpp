@@ -21,7 +21,9 @@
 // Least-cost path. Between two consecutive points, Dijkstra's search with a
 // bucket queue over integer costs; the path steps between 4-neighbouring
 // corners (along pixel edges, so the outline is a boundary of whole pixels)
-// and a step costs the cost of the corner stepped onto. The search is limited
+// and a step costs 20 plus the cost of the corner stepped onto (the constant
+// keeps paths from wandering along texture; tuned on a separate set of test
+// pictures, see bench/selection_eval.cpp). The search is limited
 // to a band around the straight segment: the corners within max(10, 2/5 of
 // its length) of it (at most 128).
 //
@@ -34,7 +36,7 @@
 // picture and a reduced cost map, and a new point costs a search on the
 // reduced band plus a narrow full-size corridor.
 //
-// Points. A tap is snapped to the cheapest corner within 3 pixels (ties: the
+// Points. A tap is snapped to the cheapest corner within 2 pixels (ties: the
 // nearest, then the first in row order). The points form a doubly linked list;
 // each point keeps the path from its predecessor, so adding, moving or
 // removing a point recomputes only the one or two segments that touch it.
@@ -66,7 +68,8 @@ namespace {
 
 constexpr int kCostMax = 255;
 constexpr int kGradHalf = 100;  // M at which the cost falls to half
-constexpr int kSnapRadius = 3;
+constexpr int kStepCost = 20;   // added to every step: a shorter path wins over a wandering one
+constexpr int kSnapRadius = 2;
 constexpr int kNearRadius = 10;
 constexpr int kMaxCoarsePixels = 1100000;
 constexpr int kMaxLength = 40959;  // a segment length never reads as a result code
@@ -156,7 +159,7 @@ uint8_t corner_cost(const int* p, int w, int h, int x, int y) {
 
 constexpr int kDx[4] = {1, -1, 0, 0};
 constexpr int kDy[4] = {0, 0, 1, -1};
-constexpr int kBuckets = kCostMax + 1;
+constexpr int kBuckets = kStepCost + kCostMax + 1;
 
 // A search area: a box of corners, with the corners that may be used.
 struct Area {
@@ -231,7 +234,7 @@ bool least_cost_path(const Area& ar, int ax, int ay, int bx, int by, Cost cost, 
         if (nx < 0 || ny < 0 || nx >= ar.bw || ny >= ar.bh) continue;
         const int ni = ny * ar.bw + nx;
         if (ar.allowed[ni] != 1) continue;
-        const int nd = cur + cost(nx + ar.x0, ny + ar.y0);
+        const int nd = cur + kStepCost + cost(nx + ar.x0, ny + ar.y0);
         if (nd < dist[ni]) {
           dist[ni] = nd;
           from[ni] = static_cast<int8_t>(k);

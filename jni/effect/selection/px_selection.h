@@ -26,7 +26,7 @@ int px_selection_width();
 int px_selection_height();
 
 // Appends a point (a tap at pixel (x, y)); it is snapped to the strongest edge
-// within 3 pixels and joined to the previous point by a least-cost path.
+// within 2 pixels and joined to the previous point by a least-cost path.
 // Returns the new segment's length in steps (0 for the first point, at most
 // 40959); 40962 without a session or for a point outside the picture; 40961
 // when memory runs short. A refused call changes nothing.

@@ -1216,7 +1216,7 @@ public final class Engine {
     // Outline coordinates are pixel corners: corner (x, y) is the top-left
     // corner of pixel (x, y), corners run 0..width and 0..height, and the
     // outline runs along pixel edges, so a closed outline selects whole pixels.
-    // A tap is snapped to the strongest edge corner within 3 pixels. Points to
+    // A tap is snapped to the strongest edge corner within 2 pixels. Points to
     // remove or move are found within 10 pixels of where they were tapped or
     // snapped to. Pictures above 1.1 megapixels are searched on a reduced copy
     // first and refined at full size near that path. A refused call (no
