@@ -846,6 +846,44 @@ int colour_diff(uint32_t a, uint32_t b) {
          std::abs(static_cast<int>(a & 255) - static_cast<int>(b & 255));
 }
 
+// A growable ring of (x, y) pairs.
+struct Ring {
+  int* v = nullptr;
+  size_t cap = 0, head = 0, count = 0;  // in pairs
+  bool push(int x, int y) {
+    if (count == cap) {
+      const size_t nc = cap ? cap * 2 : 16384;
+      int* nv = static_cast<int*>(px_malloc(nc * 2, sizeof(int)));
+      if (!nv) return false;
+      for (size_t k = 0; k < count; ++k) {
+        const size_t from = (head + k) % cap;
+        nv[2 * k] = v[2 * from];
+        nv[2 * k + 1] = v[2 * from + 1];
+      }
+      px_free(v);
+      v = nv;
+      cap = nc;
+      head = 0;
+    }
+    size_t at = head + count;
+    if (at >= cap) at -= cap;
+    v[2 * at] = x;
+    v[2 * at + 1] = y;
+    ++count;
+    return true;
+  }
+  void pop(int* x, int* y) {
+    *x = v[2 * head];
+    *y = v[2 * head + 1];
+    if (++head == cap) head = 0;
+    --count;
+  }
+  void release() {
+    px_free(v);
+    v = nullptr;
+  }
+};
+
 bool valid_size(int width, int height) {
   return width > 0 && height > 0 && static_cast<long long>(width) * height <= 0x7FFFFFFF / 4;
 }
@@ -861,39 +899,45 @@ int px_selection_tap(const int* argb, unsigned char* mask, int width, int height
   const int step = 1 + (38 * t + 50) / 100;
   const int seed_limit = 6 * step;
   const size_t n = static_cast<size_t>(width) * height;
-  uint8_t* region = static_cast<uint8_t*>(px_calloc(n, 1));
-  IntBuf queue;
+  uint8_t* region = static_cast<uint8_t*>(px_calloc(n, 1));  // 1 in, 2 refused by the seed limit
   if (!region) return PX_ERR_ALLOC;
   const uint32_t* p = reinterpret_cast<const uint32_t*>(argb);
   const size_t start = static_cast<size_t>(y) * width + x;
   const uint32_t seed = p[start];
   region[start] = 1;
-  queue.push(static_cast<int>(start));
-  for (int head = 0; queue.ok && head < queue.n; ++head) {
-    const int i = queue.v[head];
-    const int cx = i % width, cy = i / width;
+  // Breadth first over a ring of (x, y) pairs (no division per pixel; the
+  // ring holds only the front, which grows with the region's outline).
+  Ring ring;
+  bool ok = ring.push(x, y);
+  while (ok && ring.count) {
+    int cx, cy;
+    ring.pop(&cx, &cy);
+    const size_t i = static_cast<size_t>(cy) * width + cx;
     const uint32_t c = p[i];
-    const int nb[4] = {cx > 0 ? i - 1 : -1, cx + 1 < width ? i + 1 : -1, cy > 0 ? i - width : -1,
-                       cy + 1 < height ? i + width : -1};
-    for (int k = 0; k < 4; ++k) {
-      const int j = nb[k];
-      if (j < 0 || region[j]) continue;
-      if (colour_diff(c, p[j]) < step && colour_diff(seed, p[j]) < seed_limit) {
-        region[j] = 1;
-        queue.push(j);
-        if (!queue.ok) break;
+    auto visit = [&](size_t j, int nx, int ny) {
+      if (region[j]) return;
+      const uint32_t q = p[j];
+      if (colour_diff(c, q) >= step) return;
+      if (colour_diff(seed, q) >= seed_limit) {
+        region[j] = 2;  // too far from the tapped colour whichever way it is reached
+        return;
       }
-    }
+      region[j] = 1;
+      if (!ring.push(nx, ny)) ok = false;
+    };
+    if (cx > 0) visit(i - 1, cx - 1, cy);
+    if (cx + 1 < width) visit(i + 1, cx + 1, cy);
+    if (cy > 0) visit(i - width, cx, cy - 1);
+    if (cy + 1 < height) visit(i + width, cx, cy + 1);
   }
-  const bool ok = queue.ok;
-  queue.release();
+  ring.release();
   if (!ok) {
     px_free(region);
     return PX_ERR_ALLOC;
   }
   for (size_t i = 0; i < n; ++i) {
     const bool was = mask[i] == 1;
-    const bool in = region[i] != 0;
+    const bool in = region[i] == 1;
     mask[i] = mode == PX_SELECT_REPLACE ? in : mode == PX_SELECT_ADD ? (was || in) : (was && !in);
   }
   px_free(region);
