@@ -7,7 +7,8 @@ import java.util.concurrent.atomic.AtomicInteger;
 
 /**
  * Seeded random call sequences over every stateful method of {@link Engine}:
- * portrait, splash, blur, tilt-shift, backlight, saved regions, the eraser
+ * portrait, splash, blur, tilt-shift, backlight, saved regions, the selection
+ * tools (the lasso session, tap-to-select, grow, fill holes), the eraser
  * controlled from a second thread, effect progress and cancel read from a
  * second thread. Sessions are opened at one size and used at others (1 x N,
  * N x 1, sides up to 2^20, tiny previews), with hostile rectangles, levels and
@@ -476,9 +477,134 @@ public final class StatefulFuzz {
         }
     }
 
+    /** A coordinate: mostly inside the picture or just beside it, sometimes hostile. */
+    private int coordinate(int side) {
+        return rng.nextInt(5) == 0 ? hostile() : rng.nextInt(side + 6) - 3;
+    }
+
+    private static void expect(boolean ok, String what) {
+        if (!ok) {
+            throw new Fault(what);
+        }
+    }
+
+    /** The lasso's open outline as x, y pairs (empty without a session or points). */
+    private static int[] outline() {
+        int[] xy = new int[Engine.selectionOutlineLength() * 2];
+        expect(xy.length == 0 || Engine.selectionGetOutline(xy) == Engine.SUCCESS, "outline not readable");
+        return xy;
+    }
+
+    /** A refused or failed lasso call must leave the outline as it was. */
+    private static void unchangedUnless(int rc, boolean changed, int[] before, String name) {
+        if (!changed) {
+            expect(Arrays.equals(before, outline()), name + " gave " + rc + " but changed the outline");
+        }
+    }
+
+    /**
+     * The lasso session (started at one size, used while sizes change),
+     * tap-to-select, grow and fill holes. Checks the result codes each call may
+     * give and the point count they imply.
+     */
+    private void selection() {
+        long n = (long) w * h;
+        int[] image = ints(n);
+        byte[] mask = mask(n);
+        int x = coordinate(w);
+        int y = coordinate(h);
+        int before = Engine.selectionPointCount();
+        int[] was = outline();
+        // Points tapped on the same corner share it, so the outline may be shorter than the list.
+        expect(before >= 0 && (before == 0) == (Engine.selectionOutlineLength() == 0), "point count " + before
+                + " against outline " + Engine.selectionOutlineLength());
+        switch (rng.nextInt(13)) {
+            case 0:
+                if (small() || rng.nextInt(6) == 0) {
+                    call("selectionStart", of(image), of(), () -> {
+                        int rc = Engine.selectionStart(image, w, h);
+                        expect(rc == Engine.SUCCESS || rc == Engine.ERR_NULL || rc == Engine.ERR_ALLOC,
+                                "selectionStart gave " + rc);
+                        expect(rc != Engine.SUCCESS || Engine.selectionPointCount() == 0, "a new session has points");
+                        return rc;
+                    });
+                }
+                break;
+            case 1: case 2: case 3:
+                call("selectionAddPoint", of(), of(), () -> {
+                    int rc = Engine.selectionAddPoint(x, y);
+                    boolean added = rc >= 0 && rc < Engine.SUCCESS;
+                    expect(added || rc == Engine.ERR_NULL || rc == Engine.ERR_ALLOC, "selectionAddPoint gave " + rc);
+                    expect(Engine.selectionPointCount() == before + (added ? 1 : 0), "point count after adding");
+                    unchangedUnless(rc, added, was, "selectionAddPoint");
+                    return rc;
+                });
+                break;
+            case 4:
+                call("selectionRemovePoint", of(), of(), () -> {
+                    int rc = Engine.selectionRemovePoint(x, y);
+                    expect(rc == Engine.SUCCESS || rc == Engine.ERR_NULL || rc == Engine.ERR_NO_POINT
+                            || rc == Engine.ERR_ALLOC, "selectionRemovePoint gave " + rc);
+                    expect(Engine.selectionPointCount() == before - (rc == Engine.SUCCESS ? 1 : 0),
+                            "point count after removing");
+                    expect(before > 0 || rc != Engine.SUCCESS, "removed a point from an empty list");
+                    unchangedUnless(rc, rc == Engine.SUCCESS, was, "selectionRemovePoint");
+                    return rc;
+                });
+                break;
+            case 5:
+                call("selectionMovePoint", of(), of(), () -> {
+                    int rc = Engine.selectionMovePoint(x, y, coordinate(w), coordinate(h));
+                    expect(rc == Engine.SUCCESS || rc == Engine.ERR_NULL || rc == Engine.ERR_NO_POINT
+                            || rc == Engine.ERR_ALLOC, "selectionMovePoint gave " + rc);
+                    expect(Engine.selectionPointCount() == before, "a move changed the point count");
+                    unchangedUnless(rc, rc == Engine.SUCCESS, was, "selectionMovePoint");
+                    return rc;
+                });
+                break;
+            case 6: {
+                int len = Engine.selectionOutlineLength() * 2 + pick(-1, 0, 0, 3);
+                int[] xy = rng.nextInt(20) == 0 || len < 0 ? null : new int[len];
+                call("selectionGetOutline", of(), of(xy), () -> Engine.selectionGetOutline(xy));
+                break;
+            }
+            case 7: {
+                Rect r = rect();
+                call("selectionClose", of(), of(mask), () -> {
+                    int rc = Engine.selectionClose(mask, w, h, r);
+                    expect(rc == Engine.SUCCESS || rc == Engine.ERR_NULL || rc == Engine.ERR_ALLOC,
+                            "selectionClose gave " + rc);
+                    unchangedUnless(rc, false, was, "selectionClose");
+                    return rc;
+                });
+                break;
+            }
+            case 8:
+                expect(Engine.selectionFinish() == Engine.SUCCESS && Engine.selectionPointCount() == 0
+                        && Engine.selectionOutlineLength() == 0, "finish left points behind");
+                break;
+            case 9: case 10: {
+                Rect r = rect();
+                call("selectTap", of(image), of(mask), () -> Engine.selectTap(image, mask, w, h, x, y, hostile(),
+                        pick(0, 1, 2, hostile()), r));
+                break;
+            }
+            case 11: {
+                Rect r = rect();
+                call("selectGrow", of(), of(mask), () -> Engine.selectGrow(mask, w, h, pick(-3, -1, 0, 2, hostile()), r));
+                break;
+            }
+            default: {
+                Rect r = rect();
+                call("selectFillHoles", of(), of(mask), () -> Engine.selectFillHoles(mask, w, h, r));
+            }
+        }
+    }
+
     private void step() throws InterruptedException {
         maybeResize();
-        switch (rng.nextInt(40)) {
+        switch (rng.nextInt(46)) {
+            case 40: case 41: case 42: case 43: case 44: case 45: selection(); break;
             case 0: case 1: case 2: case 3: case 4: case 5: case 6: case 7: portrait(); break;
             case 8: case 9: case 10: case 11: splash(); break;
             case 12: case 13: case 14: case 15: case 16: case 17: blur(); break;
