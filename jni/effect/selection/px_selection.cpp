@@ -63,6 +63,7 @@
 #include <cstring>
 
 #include "../kalo/px_mem.h"
+#include "../px_math.h"
 
 namespace {
 
@@ -104,21 +105,6 @@ struct IntBuf {
   }
 };
 
-uint32_t isqrt(uint32_t v) {
-  uint32_t r = 0, bit = 1u << 30;
-  while (bit > v) bit >>= 2;
-  while (bit) {
-    if (v >= r + bit) {
-      v -= r + bit;
-      r = (r >> 1) + bit;
-    } else {
-      r >>= 1;
-    }
-    bit >>= 2;
-  }
-  return r;
-}
-
 // Cost of corner (x, y) of a width x height ARGB picture (pixels outside are
 // the nearest border pixel).
 uint8_t corner_cost(const int* p, int w, int h, int x, int y) {
@@ -151,7 +137,7 @@ uint8_t corner_cost(const int* p, int w, int h, int x, int y) {
   for (int ch = 0; ch < 3; ++ch) {
     m2 += static_cast<uint32_t>(gx[ch] * gx[ch]) + static_cast<uint32_t>(gy[ch] * gy[ch]);
   }
-  const int k = kGradHalf + static_cast<int>(isqrt(m2));
+  const int k = kGradHalf + static_cast<int>(px_isqrt_floor(m2));
   return static_cast<uint8_t>(1 + ((kCostMax - 1) * kGradHalf + k / 2) / k);
 }
 
