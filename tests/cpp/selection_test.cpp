@@ -568,6 +568,40 @@ TEST(SelectionTap, MatchesTheRegionsDefinitionOnRandomPictures) {
   EXPECT_GT(checked, 60);  // most taps grew beyond their own pixel
 }
 
+TEST(SelectionTap, RunningShortOfMemoryLeavesTheMaskAsItWas) {
+  // A comb: a uniform top row over 4501 one-pixel teeth, separated by another
+  // colour, so the fill holds thousands of runs at once and its stack grows.
+  const int w = 9001, h = 3;
+  std::vector<int> p(static_cast<size_t>(w) * h, grey(90));
+  for (int y = 1; y < h; ++y) {
+    for (int x = 1; x < w; x += 2) p[static_cast<size_t>(y) * w + x] = grey(230);
+  }
+  Mask prior(p.size());
+  for (size_t i = 0; i < prior.size(); ++i) prior[i] = static_cast<unsigned char>(i % 7 == 0 ? 1 : i % 5 == 0 ? 2 : 0);
+  // The top row and every tooth of the first colour, added to the prior mask.
+  Mask want = prior;
+  for (size_t i = 0; i < want.size(); ++i) want[i] = want[i] == 1 || i < static_cast<size_t>(w) || (i % w) % 2 == 0;
+  const long live = px_mem_live_blocks();
+  int failures = 0;
+  for (int n = 1; n < 20; ++n) {
+    Mask m = prior;
+    px_mem_fail_nth(n);
+    const int rc = px_selection_tap(p.data(), m.data(), w, h, 0, 0, 50, PX_SELECT_ADD, nullptr);
+    const bool failed = !px_mem_fail_pending();
+    px_mem_fail_nth(0);
+    EXPECT_EQ(live, px_mem_live_blocks());
+    if (!failed) {
+      ASSERT_EQ(PX_OK, rc);
+      EXPECT_EQ(want, m);
+      break;
+    }
+    ++failures;
+    EXPECT_EQ(PX_ERR_ALLOC, rc);
+    EXPECT_EQ(prior, m);
+  }
+  EXPECT_GE(failures, 3);  // the region, the run stack, the stack's growth
+}
+
 // ---- refinements ----------------------------------------------------------------------------
 
 Mask brute_grow(const Mask& m, int w, int h, int n) {
