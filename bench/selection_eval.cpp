@@ -308,6 +308,19 @@ int main(int argc, char** argv) {
       }
       worse_than_polygon[ni] += s[0].iou < s[1].iou;
       worse_than_opencv[ni] += s[0].iou < s[2].iou;
+      // GLIMMER_EVAL_DUMP=DIR writes each picture with the true boundary
+      // (green), the lasso's (red), OpenCV's (blue) and the taps (yellow).
+      if (const char* dump = std::getenv("GLIMMER_EVAL_DUMP")) {
+        cv::Mat v = o.picture.clone();
+        const cv::Mat* masks[3] = {&o.truth, &got[0], &filled};
+        const cv::Vec3b colours[3] = {{0, 255, 0}, {0, 0, 255}, {255, 0, 0}};
+        for (int m = 0; m < 3; ++m) {
+          const cv::Mat b = boundary(*masks[m] == 1);
+          v.setTo(cv::Scalar(colours[m][0], colours[m][1], colours[m][2]), b);
+        }
+        for (const auto& p : t) cv::circle(v, p, 3, cv::Scalar(0, 255, 255), 1);
+        cv::imwrite(std::string(dump) + "/" + std::to_string(k) + "-" + std::to_string(n) + ".png", v);
+      }
       if (argc > 4) {
         std::printf("%3d %-34s N=%2d  lasso %.4f/%.3f  polygon %.4f/%.3f  opencv %.4f/%.3f\n", k, o.name.c_str(), n,
                     s[0].iou, s[0].near, s[1].iou, s[1].near, s[2].iou, s[2].near);
