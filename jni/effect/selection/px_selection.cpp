@@ -58,6 +58,14 @@
 //
 // Grow and shrink use an exact Euclidean distance transform; fill holes
 // selects the unselected regions that do not reach the picture's border.
+//
+// Measured (bench/selection_eval.cpp, the held-out set: 40 objects on 11
+// photos not used for tuning; mean IoU with the true mask at N = 6, 10, 16
+// taps): the lasso 0.925, 0.972, 0.982; the plain polygon through the same
+// taps 0.781, 0.893, 0.944; OpenCV's intelligent scissors 0.907, 0.945,
+// 0.959. Where we lose: on an object whose inside is strongly textured, few
+// taps let the cheapest path cut through the texture instead of going round
+// (a cost that looks at the step's direction did not help on the tuning set).
 #include "px_selection.h"
 
 #include <algorithm>
