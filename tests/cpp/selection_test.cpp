@@ -103,6 +103,45 @@ TEST(SelectionEdgeCost, SeesColourStepsOfEqualGreyAndRowsAlike) {
   }
 }
 
+TEST(SelectionEdgeCost, EveryCornerFollowsTheRuleOnRandomPictures) {
+  // The rule, corner by corner: per channel, across columns
+  // sum over rows y-2..y+1 (weights 1, 3, 3, 1) of 2 (P[x] - P[x-1]) + (P[x+1] - P[x-2]),
+  // likewise down rows, pixels beyond the border repeating it; M^2 summed over
+  // channels, cost 1 + (25400 + k / 2) / k with k = 100 + floor(M).
+  const int sizes[][2] = {{1, 1}, {1, 9}, {9, 1}, {2, 2}, {3, 5}, {17, 11}, {40, 3}};
+  std::mt19937 rng(5);
+  for (const auto& sz : sizes) {
+    const int w = sz[0], h = sz[1];
+    std::vector<int> p(static_cast<size_t>(w) * h);
+    for (int& v : p) v = static_cast<int>(rng());
+    auto at = [&](int x, int y, int ch) {
+      x = std::clamp(x, 0, w - 1);
+      y = std::clamp(y, 0, h - 1);
+      return (p[static_cast<size_t>(y) * w + x] >> (16 - 8 * ch)) & 255;
+    };
+    std::vector<uint8_t> cost(static_cast<size_t>(w + 1) * (h + 1));
+    ASSERT_TRUE(px_selection_edge_cost(p.data(), w, h, cost.data()));
+    const int wk[4] = {1, 3, 3, 1};
+    for (int y = 0; y <= h; ++y) {
+      for (int x = 0; x <= w; ++x) {
+        long m2 = 0;
+        for (int ch = 0; ch < 3; ++ch) {
+          long gx = 0, gy = 0;
+          for (int k = 0; k < 4; ++k) {
+            const int r = y - 2 + k, c = x - 2 + k;
+            gx += wk[k] * (2 * (at(x, r, ch) - at(x - 1, r, ch)) + at(x + 1, r, ch) - at(x - 2, r, ch));
+            gy += wk[k] * (2 * (at(c, y, ch) - at(c, y - 1, ch)) + at(c, y + 1, ch) - at(c, y - 2, ch));
+          }
+          m2 += gx * gx + gy * gy;
+        }
+        const long k = 100 + static_cast<long>(std::sqrt(static_cast<double>(m2)));
+        ASSERT_EQ(1 + (25400 + k / 2) / k, cost[static_cast<size_t>(y) * (w + 1) + x])
+            << w << "x" << h << " corner " << x << "," << y;
+      }
+    }
+  }
+}
+
 // ---- polygon fill and bounds ------------------------------------------------------------
 
 TEST(SelectionFill, SamplesPixelCentresByNonZeroWinding) {

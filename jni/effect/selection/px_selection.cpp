@@ -74,7 +74,6 @@
 #include <cstring>
 
 #include "../kalo/px_mem.h"
-#include "../px_math.h"
 
 namespace {
 
@@ -116,6 +115,16 @@ struct IntBuf {
   }
 };
 
+// The cost for M^2, the summed squares of the three channels' gradients.
+uint8_t cost_of(uint32_t m2) {
+  // floor(sqrt(m2)): the rounded root put right by whole steps, so exact.
+  uint32_t r = static_cast<uint32_t>(std::sqrt(static_cast<double>(m2)));
+  while (static_cast<uint64_t>(r) * r > m2) --r;
+  while (static_cast<uint64_t>(r + 1) * (r + 1) <= m2) ++r;
+  const int k = kGradHalf + static_cast<int>(r);
+  return static_cast<uint8_t>(1 + ((kCostMax - 1) * kGradHalf + k / 2) / k);
+}
+
 // Cost of corner (x, y) of a width x height ARGB picture (pixels outside are
 // the nearest border pixel).
 uint8_t corner_cost(const int* p, int w, int h, int x, int y) {
@@ -148,8 +157,7 @@ uint8_t corner_cost(const int* p, int w, int h, int x, int y) {
   for (int ch = 0; ch < 3; ++ch) {
     m2 += static_cast<uint32_t>(gx[ch] * gx[ch]) + static_cast<uint32_t>(gy[ch] * gy[ch]);
   }
-  const int k = kGradHalf + static_cast<int>(px_isqrt_floor(m2));
-  return static_cast<uint8_t>(1 + ((kCostMax - 1) * kGradHalf + k / 2) / k);
+  return cost_of(m2);
 }
 
 // ---- least-cost path on a corner grid -------------------------------------------
@@ -526,11 +534,64 @@ Node* nearest(Session& s, int x, int y) {
 
 // ---- lasso ------------------------------------------------------------------------------
 
+// The same sums as corner_cost for every corner, a corner row at a time: the
+// differences across columns of each pixel row (dx, kept for the last four
+// rows) and down the rows of each pixel column (dy, for the corner row) are
+// formed once and then weighted.
 bool px_selection_edge_cost(const int* argb, int width, int height, uint8_t* cost) {
   if (!argb || !cost || width <= 0 || height <= 0) return false;
+  static const int kW[4] = {1, 3, 3, 1};
+  const size_t cw = static_cast<size_t>(width) + 1;
+  int* dx = static_cast<int*>(px_malloc(cw * 3 * 4 + static_cast<size_t>(width) * 3, sizeof(int)));
+  if (!dx) return false;
+  int* dy = dx + cw * 3 * 4;
+  int tag[4] = {-1, -1, -1, -1};  // the pixel row whose differences slot r & 3 holds
+  auto channel = [](int v, int c) { return (static_cast<uint32_t>(v) >> (16 - 8 * c)) & 255; };
+  auto clampi = [](int v, int hi) { return v < 0 ? 0 : v > hi ? hi : v; };
   for (int y = 0; y <= height; ++y) {
-    for (int x = 0; x <= width; ++x) cost[static_cast<size_t>(y) * (width + 1) + x] = corner_cost(argb, width, height, x, y);
+    const int* rows[4];
+    const int* dxr[4];
+    for (int k = 0; k < 4; ++k) {
+      const int r = clampi(y - 2 + k, height - 1);
+      rows[k] = argb + static_cast<size_t>(r) * width;
+      int* d = dx + static_cast<size_t>(r & 3) * cw * 3;
+      if (tag[r & 3] != r) {
+        tag[r & 3] = r;
+        const int* pr = rows[k];
+        for (int x = 0; x <= width; ++x) {
+          const int a = pr[clampi(x - 2, width - 1)], b = pr[clampi(x - 1, width - 1)],
+                    c = pr[clampi(x, width - 1)], e = pr[clampi(x + 1, width - 1)];
+          for (int ch = 0; ch < 3; ++ch) {
+            d[x * 3 + ch] = 2 * (static_cast<int>(channel(c, ch)) - static_cast<int>(channel(b, ch))) +
+                            (static_cast<int>(channel(e, ch)) - static_cast<int>(channel(a, ch)));
+          }
+        }
+      }
+      dxr[k] = d;
+    }
+    for (int x = 0; x < width; ++x) {
+      for (int ch = 0; ch < 3; ++ch) {
+        dy[x * 3 + ch] = 2 * (static_cast<int>(channel(rows[2][x], ch)) - static_cast<int>(channel(rows[1][x], ch))) +
+                         (static_cast<int>(channel(rows[3][x], ch)) - static_cast<int>(channel(rows[0][x], ch)));
+      }
+    }
+    uint8_t* out = cost + static_cast<size_t>(y) * cw;
+    for (int x = 0; x <= width; ++x) {
+      int cols[4];
+      for (int k = 0; k < 4; ++k) cols[k] = clampi(x - 2 + k, width - 1) * 3;
+      uint32_t m2 = 0;
+      for (int ch = 0; ch < 3; ++ch) {
+        int gx = 0, gy = 0;
+        for (int k = 0; k < 4; ++k) {
+          gx += kW[k] * dxr[k][x * 3 + ch];
+          gy += kW[k] * dy[cols[k] + ch];
+        }
+        m2 += static_cast<uint32_t>(gx * gx) + static_cast<uint32_t>(gy * gy);
+      }
+      out[x] = cost_of(m2);
+    }
   }
+  px_free(dx);
   return true;
 }
 
@@ -570,12 +631,17 @@ int px_selection_start(const int* argb, int width, int height) {
       const int y0 = cy * f, y1 = std::min(height, y0 + f);
       for (int y = y0; y < y1; ++y) {
         const int* row = argb + static_cast<size_t>(y) * width;
-        for (int x = 0; x < width; ++x) {
-          const uint32_t v = static_cast<uint32_t>(row[x]);
-          uint32_t* a = acc + (x / f) * 3;
-          a[0] += (v >> 16) & 255;
-          a[1] += (v >> 8) & 255;
-          a[2] += v & 255;
+        for (int cx = 0; cx < s.cw; ++cx) {
+          uint32_t r = 0, g = 0, b = 0;
+          for (int x = cx * f, x1 = std::min(width, x + f); x < x1; ++x) {
+            const uint32_t v = static_cast<uint32_t>(row[x]);
+            r += (v >> 16) & 255;
+            g += (v >> 8) & 255;
+            b += v & 255;
+          }
+          acc[cx * 3] += r;
+          acc[cx * 3 + 1] += g;
+          acc[cx * 3 + 2] += b;
         }
       }
       for (int cx = 0; cx < s.cw; ++cx) {
@@ -586,9 +652,13 @@ int px_selection_start(const int* argb, int width, int height) {
                              ((a[2] + cnt / 2) / cnt));
       }
     }
-    px_selection_edge_cost(small, s.cw, s.ch, s.ccost);
+    const bool costed = px_selection_edge_cost(small, s.cw, s.ch, s.ccost);
     px_free(small);
     px_free(acc);
+    if (!costed) {
+      free_session(s);
+      return PX_ERR_ALLOC;
+    }
   }
   s.active = true;
   g_sel = s;
