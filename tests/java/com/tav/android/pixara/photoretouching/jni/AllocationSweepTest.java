@@ -62,6 +62,9 @@ class AllocationSweepTest {
                 args[i] = null;
             }
         }
+        if (m.getName().equals("selectTap")) {
+            args[7] = Engine.SELECT_ADD; // the generic level would be a mode it refuses before allocating
+        }
         return args;
     }
 
