@@ -149,8 +149,10 @@ struct RgbBuffers {
 
 jint run_rgb_effect(Call& call, const jint* in, jint* texture, RgbBuffers& buf, const EffectRequest& request) {
   const size_t bytes = call.pixels() * 3;
-  buf.src = static_cast<unsigned char*>(px_calloc(bytes, 1));
-  buf.dst = static_cast<unsigned char*>(px_calloc(bytes, 1));
+  // Not zero-filled: the conversion writes every byte of src and the effect
+  // every byte of dst.
+  buf.src = static_cast<unsigned char*>(px_malloc(bytes, 1));
+  buf.dst = static_cast<unsigned char*>(px_malloc(bytes, 1));
   if (!buf.src || !buf.dst) return PX_ERR_ALLOC;
   convertIntArrayToByteArray(in, buf.src, call.width(), call.height());
   structIELImage src{call.width(), call.height(), IEL_FORMAT_RGB888, buf.src};

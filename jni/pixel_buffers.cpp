@@ -3,30 +3,50 @@
 #include <cstddef>
 #include <cstdint>
 
-namespace {
-long long pixel_count(int width, int height) { return static_cast<long long>(width) * height; }
+#include "effect/kalo/px_parallel.h"
 
-inline int from_rgb(const unsigned char* rgb, int alpha_source) {
-  return static_cast<int>((static_cast<uint32_t>(alpha_source) & 0xFF000000u) | static_cast<uint32_t>(rgb[0]) << 16 |
-                          static_cast<uint32_t>(rgb[1]) << 8 | rgb[2]);
+// Each conversion runs in row bands (px_parallel.h); the loops are plain
+// byte and word moves the compiler vectorises.
+namespace {
+bool empty_picture(int width, int height) {
+  return width < 1 || height < 1 || static_cast<long long>(width) * height < 1;
+}
+
+inline uint32_t from_rgb(const unsigned char* rgb, uint32_t alpha_source) {
+  return (alpha_source & 0xFF000000u) | static_cast<uint32_t>(rgb[0]) << 16 | static_cast<uint32_t>(rgb[1]) << 8 |
+         rgb[2];
+}
+
+// body(i0, i1) over disjoint pixel ranges made of whole rows.
+template <class Body>
+void for_pixels(int width, int height, Body&& body) {
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) { body(static_cast<size_t>(y0) * w, static_cast<size_t>(y1) * w); });
 }
 }  // namespace
 
 void convertIntArrayToByteArray(const int* argb, unsigned char* rgb, int width, int height) {
-  const long long n = pixel_count(width, height);
-  if (width < 1 || height < 1 || n < 1) return;
-  for (long long i = 0; i < n; ++i, rgb += 3) {
-    const uint32_t p = static_cast<uint32_t>(argb[i]);
-    rgb[0] = static_cast<unsigned char>(p >> 16);
-    rgb[1] = static_cast<unsigned char>(p >> 8);
-    rgb[2] = static_cast<unsigned char>(p);
-  }
+  if (empty_picture(width, height)) return;
+  const auto* src = reinterpret_cast<const uint32_t*>(argb);
+  for_pixels(width, height, [&](size_t i0, size_t i1) {
+    unsigned char* d = rgb + i0 * 3;
+    for (size_t i = i0; i < i1; ++i, d += 3) {
+      const uint32_t p = src[i];
+      d[0] = static_cast<unsigned char>(p >> 16);
+      d[1] = static_cast<unsigned char>(p >> 8);
+      d[2] = static_cast<unsigned char>(p);
+    }
+  });
 }
 
 void convertByteArraytoIntArray(const unsigned char* rgb, int* out, const int* alphaSource, int width, int height) {
-  const long long n = pixel_count(width, height);
-  if (width < 1 || height < 1 || n < 1) return;
-  for (long long i = 0; i < n; ++i, rgb += 3) out[i] = from_rgb(rgb, alphaSource[i]);
+  if (empty_picture(width, height)) return;
+  const auto* alpha = reinterpret_cast<const uint32_t*>(alphaSource);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  for_pixels(width, height, [&](size_t i0, size_t i1) {
+    const unsigned char* s = rgb + i0 * 3;
+    for (size_t i = i0; i < i1; ++i, s += 3) dst[i] = from_rgb(s, alpha[i]);
+  });
 }
 
 void convertByteArraytoIntArrayUsingMask(const unsigned char* rgb, int* out, const int* source,
@@ -35,7 +55,15 @@ void convertByteArraytoIntArrayUsingMask(const unsigned char* rgb, int* out, con
     convertByteArraytoIntArray(rgb, out, source, width, height);
     return;
   }
-  const long long n = pixel_count(width, height);
-  if (width < 1 || height < 1 || n < 1) return;
-  for (long long i = 0; i < n; ++i, rgb += 3) out[i] = mask[i] == 1 ? from_rgb(rgb, source[i]) : source[i];
+  if (empty_picture(width, height)) return;
+  const auto* src = reinterpret_cast<const uint32_t*>(source);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  for_pixels(width, height, [&](size_t i0, size_t i1) {
+    const unsigned char* s = rgb + i0 * 3;
+    for (size_t i = i0; i < i1; ++i, s += 3) {
+      // Branch-free select so the loop vectorises.
+      const uint32_t keep = mask[i] == 1 ? 0u : ~0u;
+      dst[i] = (src[i] & keep) | (from_rgb(s, src[i]) & ~keep);
+    }
+  });
 }
