@@ -247,3 +247,133 @@ TEST(FilterChainsFast, DawnCastMatchesTheStepByStepChainWithAnyArraysShared) {
 }
 
 }  // namespace
+
+namespace {
+
+// ---- tone, hue, point colour -----------------------------------------------------
+
+using RegionOp = void (*)(int*, unsigned char*, int*, int, int, int, px_rect);
+
+int exposure(int* in, unsigned char* mask, int* out, int w, int h, int level, px_rect r) {
+  return px_control_exposure(in, mask, out, w, h, level, r);
+}
+int faded(int* in, unsigned char* mask, int* out, int w, int h, int level, px_rect r) {
+  return px_control_fadedcolor(in, mask, out, w, h, level, r);
+}
+int hue(int* in, unsigned char* mask, int* out, int w, int h, int level, px_rect r) {
+  return px_control_hue(in, mask, out, w, h, level, r);
+}
+int hue100(int* in, unsigned char* mask, int* out, int w, int h, int level, px_rect r) {
+  return px_control_hue_range100(in, mask, out, w, h, level, r);
+}
+
+struct RegionCase {
+  const char* name;
+  std::function<void(int*, unsigned char*, int*, int, int, int, px_rect)> op;
+  int lo, hi;  // levels, every one tried
+};
+
+const RegionCase kRegionOps[] = {
+    {"brightness", px_control_brightness, -1, 21},
+    {"brightness100", px_control_brightness_range100, 0, 100},
+    {"contrast", px_control_contrast, 0, 20},
+    {"saturation", px_control_saturation, -1, 21},
+    {"saturation100", px_control_saturation_range100, 0, 100},
+    {"temperature", px_control_temperature, 0, 20},
+    {"temperature100", px_control_temperature_range100, 0, 100},
+    {"greyscale", px_control_greyscale, -2, 22},
+    {"exposure", exposure, 0, 20},
+    {"faded", faded, -3, 100},
+    {"hue", hue, -1, 21},
+    {"hue100", hue100, -1, 101},
+};
+
+// Whole picture, a rectangle reaching outside it and one wholly outside it,
+// each with a random mask; in place as well.
+TEST(RegionOpsFast, EveryLevelMatchesThePlainPath) {
+  for (const RegionCase& c : kRegionOps) {
+    for (auto [w, h] : {std::pair{1, 37}, {37, 1}, {17, 9}, {31, 131}}) {
+      Pic in = random_picture(w, h, 81 + w);
+      const auto mask = random_mask(in.size(), 82 + h);
+      auto m = mask;
+      for (int level = c.lo; level <= c.hi; ++level) {
+        for (px_rect r : {px_rect{0, -1, 0, -1}, px_rect{w / 3, w + 4, -2, h / 2}, px_rect{w + 1, w + 5, 0, h}}) {
+          const std::string what = label(c.name, " level ", level, " ", w, "x", h, " rect ", r.left, ",", r.right);
+          expect_same_both_ways(
+              Pic(in.size(), 0x0BADF00D), [&](Pic& o) { c.op(in.data(), m.data(), o.data(), w, h, level, r); }, what);
+          expect_same_both_ways(
+              in, [&](Pic& o) { c.op(o.data(), m.data(), o.data(), w, h, level, r); }, "in place " + what);
+        }
+      }
+      EXPECT_EQ(m, mask) << c.name << ": the mask is only read";
+    }
+  }
+}
+
+// Hue on a lattice of colours through the whole cube (every HSV sector, the
+// greys and both ends of every channel), for every level of both scales.
+TEST(RegionOpsFast, HueOverTheColourCube) {
+  Pic cube;
+  for (int r = 0; r < 256; r += 5)
+    for (int g = 0; g < 256; g += 5)
+      for (int b = 0; b < 256; b += 3) cube.push_back(static_cast<int>(0x80000000u | r << 16 | g << 8 | b));
+  const int w = 401, h = static_cast<int>(cube.size() / 401);
+  cube.resize(static_cast<size_t>(w) * h);
+  const px_rect whole{0, -1, 0, -1};
+  for (int level = 0; level <= 100; ++level) {
+    expect_same_both_ways(
+        Pic(cube.size()), [&](Pic& o) { hue100(cube.data(), nullptr, o.data(), w, h, level, whole); },
+        label("hue100 ", level));
+    if (level <= 20) {
+      expect_same_both_ways(
+          Pic(cube.size()), [&](Pic& o) { hue(cube.data(), nullptr, o.data(), w, h, level, whole); },
+          label("hue ", level));
+    }
+  }
+}
+
+// Faded colour's maps against its division, every channel value and level;
+// greyscale's reciprocal against its division by 3 for every channel sum.
+TEST(RegionOpsFast, FadedMapsAndGreyscaleReciprocalAgreeWithTheDivisions) {
+  for (int s = 0; s <= 765; ++s) ASSERT_EQ(s / 3, (s * 43691) >> 17) << s;
+  Pic greys(256);
+  for (int v = 0; v < 256; ++v) greys[v] = static_cast<int>(0xFF000000u | static_cast<uint32_t>(v) * 0x010101u);
+  // Channel sums 0..765 with different channel splits.
+  Pic sums;
+  for (int s = 0; s <= 765; ++s) {
+    const int r = s > 510 ? 255 : (s > 255 ? s - 255 : s), g = s > 510 ? s - 510 : (s > 255 ? 255 : 0),
+              b = s > 510 ? 255 : 0;
+    sums.push_back(static_cast<int>(0xFF000000u | r << 16 | g << 8 | b));
+    sums.push_back(static_cast<int>(0xFF000000u | g << 16 | b << 8 | r));
+  }
+  const px_rect whole{0, -1, 0, -1};
+  for (int level = -3; level <= 100; ++level) {
+    expect_same_both_ways(
+        Pic(256), [&](Pic& o) { px_control_fadedcolor_all(greys.data(), o.data(), 256, 1, level); },
+        label("faded ", level));
+  }
+  for (int level = -2; level <= 22; ++level) {
+    const int n = static_cast<int>(sums.size());
+    expect_same_both_ways(
+        Pic(sums.size()), [&](Pic& o) { px_control_greyscale(sums.data(), nullptr, o.data(), n, 1, level, whole); },
+        label("greyscale ", level));
+  }
+}
+
+TEST(PointColourFast, EveryColourKeptOrGreyedAsThePlainPath) {
+  using Whole = void (*)(int*, int*, int, int);
+  const std::pair<const char*, Whole> ops[] = {{"red", px_point_color_red},
+                                               {"yellow", px_point_color_yellow},
+                                               {"green", px_point_color_green},
+                                               {"blue", px_point_color_blue}};
+  for (auto [name, fn] : ops) {
+    for (auto [w, h] : kSizes) {
+      const Pic in = random_picture(w, h, 91 + w);
+      expect_same_both_ways(
+          Pic(in.size()), [&](Pic& o) { fn(const_cast<int*>(in.data()), o.data(), w, h); },
+          label(name, " ", w, "x", h));
+    }
+  }
+}
+
+}  // namespace

@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "px_fixed.h"
+#include "px_fixed_tables.h"
 #include "px_region.h"
 
 const int LUT_HueValue_Range100[101] = {
@@ -54,6 +55,61 @@ struct HueShift {
   }
 };
 
+// HueShift with the two HSV conversions written out inline, the same
+// arithmetic step for step, so the per-pixel work needs no calls.
+inline int32_t wrap_mul(int32_t a, int32_t b) {
+  return static_cast<int32_t>(static_cast<uint32_t>(a) * static_cast<uint32_t>(b));
+}
+
+struct HueShiftInline {
+  int shift;
+  uint32_t operator()(uint32_t p) const {
+    const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
+              b = static_cast<int>(p & 255);
+    int v = r > g ? r : g;
+    if (b > v) v = b;
+    int min = r < g ? r : g;
+    if (b < min) min = b;
+    const int delta = v - min;
+    const int s = static_cast<int>(LUT_DELTA[v & 255] * static_cast<uint32_t>(delta));
+    if (v == 0 || s == 0) return p;  // grey stays grey
+    const int k = static_cast<int>(LUT_DELTA2[delta & 255]);
+    fixed hf;
+    if (r == v) {
+      hf = k * (g - b);
+    } else if (g == v) {
+      hf = itofix(120) + k * (b - r);
+    } else {
+      hf = itofix(240) + k * (r - g);
+    }
+    if (hf < 0) hf += itofix(360);
+    int h = static_cast<int>(static_cast<uint32_t>(fixtoi(hf)) + static_cast<uint32_t>(shift));
+    if (h < 0) {
+      h += 360;
+    } else if (h > 359) {
+      h -= 360;
+    }
+    int sector = 0, f = 0;
+    if (h != 360) {
+      const int t = wrap_mul(h, 1092);
+      sector = t >> 16;
+      f = t - (sector << 16);
+    }
+    if (sector < 0 || sector > 5) return p;
+    const int lo = fixtoi(wrap_mul(v, 65536 - s));
+    const int q = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * (f >> 4)) >> 8)));
+    const int u = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * ((65536 - f) >> 4)) >> 8)));
+    switch (sector) {
+      case 0: return px_argb(p, v, u, lo);
+      case 1: return px_argb(p, q, v, lo);
+      case 2: return px_argb(p, lo, v, u);
+      case 3: return px_argb(p, lo, q, v);
+      case 4: return px_argb(p, u, lo, v);
+      default: return px_argb(p, v, lo, q);
+    }
+  }
+};
+
 int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, int shift, px_rect rect) {
   if (!in || !out) return PX_ERR_NULL;
   if (shift == 0) {
@@ -62,7 +118,11 @@ int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, in
     }
     return PX_OK;
   }
-  px_region_map(in, mask, out, width, height, rect, HueShift{shift});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, HueShift{shift});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, HueShiftInline{shift});
+  }
   return PX_OK;
 }
 
@@ -113,9 +173,12 @@ struct PointColour {
     int r, g, b;
     unpack(p, &r, &g, &b);
     const Ycc v = to_ycc(r, g, b);
-    if (!keep(v.cb, v.cr)) return px_argb(p, v.y, v.y, v.y);
-    return px_argb(p, px_clamp255(v.y + ((v.cr * 359) >> 8)), px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)),
-                   px_clamp255(v.y + ((v.cb * 454) >> 8)));
+    // Both results, then a select: the loop vectorises.
+    const uint32_t grey = px_argb(p, v.y, v.y, v.y);
+    const uint32_t colour =
+        px_argb(p, px_clamp255(v.y + ((v.cr * 359) >> 8)), px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)),
+                px_clamp255(v.y + ((v.cb * 454) >> 8)));
+    return keep(v.cb, v.cr) ? colour : grey;
   }
 };
 

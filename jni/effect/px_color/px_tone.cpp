@@ -71,12 +71,20 @@ int px_control_exposure(int* in, unsigned char* mask, int* out, int width, int h
 
 int px_control_fadedcolor(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
   if (!in || !mask || !out || level > 100) return PX_ERR_NULL;
-  px_region_map(in, mask, out, width, height, rect, Faded{level, 100 - level});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, Faded{level, 100 - level});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, faded_maps(level));
+  }
   return PX_OK;
 }
 
 void px_control_greyscale(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Greyscale{greyscale_gain_of(level)});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, Greyscale{greyscale_gain_of(level)});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, GreyscaleFast{greyscale_gain_of(level)});
+  }
 }
 
 void px_control_brightness_all(int* in, int* out, int width, int height, int level) {
@@ -93,7 +101,11 @@ void px_control_temperature_all(int* in, int* out, int width, int height, int le
 }
 int px_control_fadedcolor_all(int* in, int* out, int width, int height, int level) {
   if (!in || !out || level > 100) return PX_ERR_NULL;
-  px_map_pixels(in, out, width, height, Faded{level, 100 - level});
+  if (px_scalar_only()) {
+    px_map_pixels(in, out, width, height, Faded{level, 100 - level});
+  } else {
+    px_map_pixels(in, out, width, height, faded_maps(level));
+  }
   return PX_OK;
 }
 int px_control_exposure_all(int* in, int* out, int width, int height, int level) {

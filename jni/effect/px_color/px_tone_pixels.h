@@ -194,4 +194,29 @@ ChannelMaps channel_maps_of(Steps steps) {
   return m;
 }
 
+// Faded colour's channels each depend on that channel alone: one map each,
+// so no division per pixel.
+inline ChannelMaps faded_maps(int level) {
+  const Faded f{level, 100 - level};
+  ChannelMaps m{};
+  for (int c = 0; c < 256; ++c) {
+    m.r[c] = static_cast<uint8_t>(Faded::channel(c, f.g, f.f, 141, 26520));
+    m.g[c] = static_cast<uint8_t>(Faded::channel(c, f.g, f.f, 188, 13260));
+    m.b[c] = static_cast<uint8_t>(Faded::channel(c, f.g, f.f, 107, 18360));
+  }
+  return m;
+}
+
+// Greyscale with the mean of the channels taken by a reciprocal:
+// s / 3 = (s * 43691) >> 17 for every channel sum s = 0..765.
+struct GreyscaleFast {
+  int gain;  // 16.16
+  uint32_t operator()(uint32_t p) const {
+    const int s = static_cast<int>(((p >> 16) & 255) + ((p >> 8) & 255) + (p & 255));
+    const int m = (s * 43691) >> 17;
+    const int v = px_clamp255((m * gain) >> 16);  // 32-bit product, wrapping as on the target
+    return px_argb(p, v, v, v);
+  }
+};
+
 }  // namespace px_tone

@@ -64,12 +64,14 @@ int IEL_VariableBrightness_ARGB8888(structIELImage* input, structIELImage* outpu
   }
   uint32_t table[256];
   for (int i = 0; i < 256; ++i) table[i] = static_cast<uint32_t>(px_clamp255(i + level));
-  const long long count = static_cast<long long>(input->width) * input->height;
   const auto* src = reinterpret_cast<const uint32_t*>(input->buffer);
   auto* dst = reinterpret_cast<uint32_t*>(output->buffer);
-  for (long long i = 0; i < count; ++i) {
-    uint32_t p = src[i];
-    dst[i] = (p & 0xFF000000u) | table[(p >> 16) & 255] << 16 | table[(p >> 8) & 255] << 8 | table[p & 255];
-  }
+  const size_t w = static_cast<size_t>(input->width);
+  px_for_rows(input->height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      const uint32_t p = src[i];
+      dst[i] = (p & 0xFF000000u) | table[(p >> 16) & 255] << 16 | table[(p >> 8) & 255] << 8 | table[p & 255];
+    }
+  });
   return IEL_OK;
 }
