@@ -199,8 +199,10 @@ TEST(AutoAdjustFast, LargePicturesMatchThePlainPath) {
 using WholeFilter = void (*)(int*, int*, int, int);
 
 TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
-  const std::pair<const char*, WholeFilter> chains[] = {
-      {"retro", px_apply_retro}, {"vintage", px_apply_vintage}, {"vintage preview", px_apply_vintage_prev}};
+  const std::pair<const char*, WholeFilter> chains[] = {{"retro", px_apply_retro},
+                                                        {"vintage", px_apply_vintage},
+                                                        {"vintage preview", px_apply_vintage_prev},
+                                                        {"gothic noir", gpu_gothicnoir}};
   for (auto [name, fn] : chains) {
     for (auto [w, h] : kSizes) {
       Pic in = random_picture(w, h, 61 + w * 7 + h);
