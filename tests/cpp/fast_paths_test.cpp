@@ -148,6 +148,24 @@ TEST(EffectsFast, SepiaMatchesThePlainLoopInEveryFormatAndLevel) {
   }
 }
 
+TEST(EffectsFast, PosterizeMatchesThePlainLoopInEveryFormat) {
+  for (auto [w, h] : kSizes) {
+    const size_t n = static_cast<size_t>(w) * h;
+    std::vector<unsigned char> src(n * 4);
+    std::mt19937 rng(35 + w);
+    for (auto& b : src) b = static_cast<unsigned char>(rng());
+    for (int16_t format : {IEL_FORMAT_RGB565, IEL_FORMAT_RGB888, IEL_FORMAT_ARGB_PACK}) {
+      expect_same_both_ways(
+          std::vector<unsigned char>(n * 4, 0x66),
+          [&](std::vector<unsigned char>& o) {
+            structIELImage a{w, h, format, src.data()}, b{w, h, format, o.data()};
+            ASSERT_EQ(IEL_PosterizeNew(&a, &b), IEL_OK);
+          },
+          label(w, "x", h, " format ", format));
+    }
+  }
+}
+
 TEST(EffectsFast, VintageCurvesMatchThePlainLoop) {
   for (auto [w, h] : kSizes) {
     const Pic in = random_picture(w, h, 41 + h);
