@@ -67,46 +67,31 @@ struct HueShiftInline {
     const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
               b = static_cast<int>(p & 255);
     int v = r > g ? r : g;
-    if (b > v) v = b;
+    v = b > v ? b : v;
     int min = r < g ? r : g;
-    if (b < min) min = b;
+    min = b < min ? b : min;
     const int delta = v - min;
     const int s = static_cast<int>(LUT_DELTA[v & 255] * static_cast<uint32_t>(delta));
-    if (v == 0 || s == 0) return p;  // grey stays grey
+    // Every case is computed and the right one selected: no branches for the
+    // random-looking order in which a picture's pixels take them.
     const int k = static_cast<int>(LUT_DELTA2[delta & 255]);
-    fixed hf;
-    if (r == v) {
-      hf = k * (g - b);
-    } else if (g == v) {
-      hf = itofix(120) + k * (b - r);
-    } else {
-      hf = itofix(240) + k * (r - g);
-    }
-    if (hf < 0) hf += itofix(360);
+    const fixed from_r = k * (g - b), from_g = itofix(120) + k * (b - r), from_b = itofix(240) + k * (r - g);
+    fixed hf = r == v ? from_r : (g == v ? from_g : from_b);
+    hf += hf < 0 ? itofix(360) : 0;
     int h = static_cast<int>(static_cast<uint32_t>(fixtoi(hf)) + static_cast<uint32_t>(shift));
-    if (h < 0) {
-      h += 360;
-    } else if (h > 359) {
-      h -= 360;
-    }
-    int sector = 0, f = 0;
-    if (h != 360) {
-      const int t = wrap_mul(h, 1092);
-      sector = t >> 16;
-      f = t - (sector << 16);
-    }
-    if (sector < 0 || sector > 5) return p;
+    h += h < 0 ? 360 : (h > 359 ? -360 : 0);
+    const int t = wrap_mul(h, 1092);
+    const int sector = h == 360 ? 0 : t >> 16;
+    const int f = h == 360 ? 0 : t - (sector << 16);
     const int lo = fixtoi(wrap_mul(v, 65536 - s));
     const int q = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * (f >> 4)) >> 8)));
     const int u = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * ((65536 - f) >> 4)) >> 8)));
-    switch (sector) {
-      case 0: return px_argb(p, v, u, lo);
-      case 1: return px_argb(p, q, v, lo);
-      case 2: return px_argb(p, lo, v, u);
-      case 3: return px_argb(p, lo, q, v);
-      case 4: return px_argb(p, u, lo, v);
-      default: return px_argb(p, v, lo, q);
-    }
+    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q.
+    const int ro = sector == 0 || sector == 5 ? v : (sector == 1 ? q : (sector == 4 ? u : lo));
+    const int go = sector == 1 || sector == 2 ? v : (sector == 0 ? u : (sector == 3 ? q : lo));
+    const int bo = sector == 3 || sector == 4 ? v : (sector == 2 ? u : (sector == 5 ? q : lo));
+    const bool keep = v == 0 || s == 0 || sector < 0 || sector > 5;  // grey stays grey
+    return keep ? p : px_argb(p, ro, go, bo);
   }
 };
 
