@@ -20,6 +20,7 @@
 #include "effect/px_color/px_auto_adjust.h"
 #include "effect/px_color/px_hue.h"
 #include "effect/px_color/px_tone.h"
+#include "effect/px_color/px_tone_pixels.h"
 #include "effect/px_filter/px_filter.h"
 #include "effect/px_gpu_effects/px_gpu_effects.h"
 #include "pixel_buffers.h"
@@ -392,6 +393,30 @@ TEST(PointColourFast, EveryColourKeptOrGreyedAsThePlainPath) {
       expect_same_both_ways(
           Pic(in.size()), [&](Pic& o) { fn(const_cast<int*>(in.data()), o.data(), w, h); },
           label(name, " ", w, "x", h));
+    }
+  }
+}
+
+}  // namespace
+
+namespace {
+
+// The table-free contrast and faded colour of the fused retro against their
+// tables, for every channel value and every level they can be given.
+TEST(FilterChainsFast, TableFreeStepsAgreeWithTheirTables) {
+  for (int step = 0; step <= 137; ++step) ASSERT_EQ(step / 10, (step * 205) >> 11) << step;
+  for (int k = -60; k <= 60; ++k) {
+    const px_tone::Curve table = px_tone::contrast_curve(k);
+    const px_tone::ContrastArith arith{k};
+    for (int c = 0; c < 256; ++c) ASSERT_EQ(arith.channel(c), table.map[c]) << "contrast " << k << " at " << c;
+  }
+  for (int level = 0; level <= 100; ++level) {
+    const px_tone::ChannelMaps maps = px_tone::faded_maps(level);
+    const px_tone::FadedArith arith{level, 100 - level};
+    for (int c = 0; c < 256; ++c) {
+      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 141, 26520), maps.r[c]) << level << " " << c;
+      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 188, 13260), maps.g[c]) << level << " " << c;
+      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 107, 18360), maps.b[c]) << level << " " << c;
     }
   }
 }
