@@ -78,7 +78,9 @@ void expect_same_both_ways(const Out& start, Op op, const std::string& what) {
 // ---- the bridge's conversions ------------------------------------------------
 
 TEST(PixelBuffersFast, ConversionsAndMaskedMergeMatchThePlainLoops) {
-  for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : kSizes) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const size_t n = static_cast<size_t>(w) * h;
     const Pic in = random_picture(w, h, 11 + w), alpha = random_picture(w, h, 12 + h);
     const auto mask = random_mask(n, 13 + w * h);
@@ -105,7 +107,9 @@ TEST(PixelBuffersFast, ConversionsAndMaskedMergeMatchThePlainLoops) {
 TEST(PixelBuffersFast, RgbEffectsWriteEveryOutputByte) {
   const int16_t effects[] = {IEL_EFFECT_SEPIA,     IEL_EFFECT_CARTOON,  IEL_EFFECT_MAGIC_PEN,     IEL_EFFECT_OIL_PAINT,
                              IEL_EFFECT_POSTERIZE, IEL_EFFECT_HALFTONE, IEL_EFFECT_SKETCH_TEXTURE};
-  for (auto [w, h] : {std::pair{1, 1}, {2, 9}, {9, 2}, {33, 17}}) {
+  for (const auto& pair_ : {std::pair{1, 1}, {2, 9}, {9, 2}, {33, 17}}) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const size_t n = static_cast<size_t>(w) * h;
     const Pic argb = random_picture(w, h, 21 + w), texture = random_picture(w, h, 22);
     std::vector<unsigned char> rgb(n * 3);
@@ -129,7 +133,9 @@ TEST(PixelBuffersFast, RgbEffectsWriteEveryOutputByte) {
 // ---- effect library ----------------------------------------------------------
 
 TEST(EffectsFast, SepiaMatchesThePlainLoopInEveryFormatAndLevel) {
-  for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : kSizes) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const size_t n = static_cast<size_t>(w) * h;
     std::vector<unsigned char> src(n * 4);
     std::mt19937 rng(31 + w);
@@ -150,7 +156,9 @@ TEST(EffectsFast, SepiaMatchesThePlainLoopInEveryFormatAndLevel) {
 }
 
 TEST(EffectsFast, PosterizeMatchesThePlainLoopInEveryFormat) {
-  for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : kSizes) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const size_t n = static_cast<size_t>(w) * h;
     std::vector<unsigned char> src(n * 4);
     std::mt19937 rng(35 + w);
@@ -168,7 +176,9 @@ TEST(EffectsFast, PosterizeMatchesThePlainLoopInEveryFormat) {
 }
 
 TEST(EffectsFast, VintageCurvesMatchThePlainLoop) {
-  for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : kSizes) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const Pic in = random_picture(w, h, 41 + h);
     expect_same_both_ways(
         Pic(in.size(), 0),
@@ -222,8 +232,12 @@ TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
                                                         {"vintage", px_apply_vintage},
                                                         {"vintage preview", px_apply_vintage_prev},
                                                         {"gothic noir", gpu_gothicnoir}};
-  for (auto [name, fn] : chains) {
-    for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : chains) {
+    const auto name = pair_.first;
+    const auto fn = pair_.second;
+    for (const auto& pair_ : kSizes) {
+      const auto w = pair_.first;
+      const auto h = pair_.second;
       Pic in = random_picture(w, h, 61 + w * 7 + h);
       expect_same_both_ways(
           Pic(in.size(), 0), [&](Pic& o) { fn(in.data(), o.data(), w, h); }, label(name, " ", w, "x", h));
@@ -235,7 +249,9 @@ TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
 }
 
 TEST(FilterChainsFast, DawnCastMatchesTheStepByStepChainWithAnyArraysShared) {
-  for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : kSizes) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
     const Pic in = random_picture(w, h, 71 + w), overlay = random_picture(w, h, 72 + h),
               screen = random_picture(w, h, 73);
     Pic ov = overlay, sc = screen;
@@ -313,7 +329,9 @@ const RegionCase kRegionOps[] = {
 // each with a random mask; in place as well.
 TEST(RegionOpsFast, EveryLevelMatchesThePlainPath) {
   for (const RegionCase& c : kRegionOps) {
-    for (auto [w, h] : {std::pair{1, 37}, {37, 1}, {17, 9}, {31, 131}}) {
+    for (const auto& pair_ : {std::pair{1, 37}, {37, 1}, {17, 9}, {31, 131}}) {
+      const auto w = pair_.first;
+      const auto h = pair_.second;
       Pic in = random_picture(w, h, 81 + w);
       const auto mask = random_mask(in.size(), 82 + h);
       auto m = mask;
@@ -387,8 +405,12 @@ TEST(PointColourFast, EveryColourKeptOrGreyedAsThePlainPath) {
                                                {"yellow", px_point_color_yellow},
                                                {"green", px_point_color_green},
                                                {"blue", px_point_color_blue}};
-  for (auto [name, fn] : ops) {
-    for (auto [w, h] : kSizes) {
+  for (const auto& pair_ : ops) {
+    const auto name = pair_.first;
+    const auto fn = pair_.second;
+    for (const auto& pair_ : kSizes) {
+      const auto w = pair_.first;
+      const auto h = pair_.second;
       const Pic in = random_picture(w, h, 91 + w);
       expect_same_both_ways(
           Pic(in.size()), [&](Pic& o) { fn(const_cast<int*>(in.data()), o.data(), w, h); },
