@@ -321,7 +321,7 @@ const RegionCase kRegionOps[] = {
     {"greyscale", px_control_greyscale, -2, 22},
     {"exposure", exposure, 0, 20},
     {"faded", faded, -3, 100},
-    {"hue", hue, -1, 21},
+    {"hue", hue, -41, 61},
     {"hue100", hue100, -1, 101},
 };
 

@@ -95,9 +95,21 @@ struct HueShiftInline {
   }
 };
 
+// True when no hue 0..360 turned by `shift` lands in a sector (a turn of
+// more than two full circles): every pixel then keeps its colour.
+bool turns_nothing(int shift) {
+  for (int h = 0; h <= 360; ++h) {
+    int h2 = static_cast<int>(static_cast<uint32_t>(h) + static_cast<uint32_t>(shift));
+    h2 += h2 < 0 ? 360 : (h2 > 359 ? -360 : 0);
+    const int sector = hue_sector(h2);
+    if (sector >= 0 && sector <= 5) return false;
+  }
+  return true;
+}
+
 int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, int shift, px_rect rect) {
   if (!in || !out) return PX_ERR_NULL;
-  if (shift == 0) {
+  if (shift == 0 || (!px_scalar_only() && turns_nothing(shift))) {
     if (in != out && width > 0 && height > 0) {
       std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
     }
