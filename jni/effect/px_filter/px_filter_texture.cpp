@@ -12,29 +12,31 @@
 namespace {
 using namespace px_tone;
 
+// Each channel written out (no loop over the channel shifts), so the
+// fused loop below needs no inner loop.
+inline uint32_t screen_channel(uint32_t p, uint32_t t, int s) {
+  const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+  return (255u - (((255u - c) * (255u - k)) >> 8)) << s;  // divides by 256: 0 with 0 gives 1
+}
+
 inline uint32_t screen_pixel(uint32_t p, uint32_t t) {
   if ((p >> 24) == 0) return 0;
-  uint32_t o = p & 0xFF000000u;
-  for (int s = 0; s <= 16; s += 8) {
-    const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
-    o |= (255u - (((255u - c) * (255u - k)) >> 8)) << s;  // divides by 256: 0 with 0 gives 1
-  }
-  return o;
+  return (p & 0xFF000000u) | screen_channel(p, t, 16) | screen_channel(p, t, 8) | screen_channel(p, t, 0);
+}
+
+inline uint32_t overlay_channel(uint32_t p, uint32_t t, int s) {
+  const uint32_t ia = p >> 24, ta = t >> 24;
+  const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+  const uint32_t v = c < 128 ? (k * c) >> 7 : 255u - (((255u - k) * (255u - c)) >> 7);
+  // The mix weight of the picture is ta XOR ia (255 - ta when opaque).
+  // For a translucent picture the sum can pass 255; it is held at 255.
+  const uint32_t m = (ta * v + c * (ta ^ ia)) >> 8;
+  return (m > 255u ? 255u : m) << s;
 }
 
 inline uint32_t overlay_pixel(uint32_t p, uint32_t t) {
-  const uint32_t ia = p >> 24, ta = t >> 24;
-  if (ia == 0) return 0;
-  uint32_t o = p & 0xFF000000u;
-  for (int s = 0; s <= 16; s += 8) {
-    const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
-    const uint32_t v = c < 128 ? (k * c) >> 7 : 255u - (((255u - k) * (255u - c)) >> 7);
-    // The mix weight of the picture is ta XOR ia (255 - ta when opaque).
-    // For a translucent picture the sum can pass 255; it is held at 255.
-    const uint32_t m = (ta * v + c * (ta ^ ia)) >> 8;
-    o |= (m > 255u ? 255u : m) << s;
-  }
-  return o;
+  if ((p >> 24) == 0) return 0;
+  return (p & 0xFF000000u) | overlay_channel(p, t, 16) | overlay_channel(p, t, 8) | overlay_channel(p, t, 0);
 }
 
 // Dawn cast in one pass: brightness, then contrast, exposure and RGB balance
