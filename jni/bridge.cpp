@@ -5,6 +5,7 @@
 
 #include "effect/kalo/px_log.h"
 #include "effect/kalo/px_mem.h"
+#include "effect/kalo/px_parallel.h"
 #include "pixel_buffers.h"
 
 namespace bridge {
@@ -141,6 +142,7 @@ namespace {
 struct RgbBuffers {
   unsigned char* src = nullptr;
   unsigned char* dst = nullptr;
+  unsigned char* result = nullptr;  // dst, or src for an effect run in place
   ~RgbBuffers() {
     px_free(src);
     px_free(dst);
@@ -149,12 +151,16 @@ struct RgbBuffers {
 
 jint run_rgb_effect(Call& call, const jint* in, jint* texture, RgbBuffers& buf, const EffectRequest& request) {
   const size_t bytes = call.pixels() * 3;
-  buf.src = static_cast<unsigned char*>(px_calloc(bytes, 1));
-  buf.dst = static_cast<unsigned char*>(px_calloc(bytes, 1));
-  if (!buf.src || !buf.dst) return PX_ERR_ALLOC;
+  // Not zero-filled: the conversion writes every byte of src and the effect
+  // every byte of dst.
+  const bool in_place = request.in_place && !px_scalar_only();
+  buf.src = static_cast<unsigned char*>(px_malloc(bytes, 1));
+  if (!in_place) buf.dst = static_cast<unsigned char*>(px_malloc(bytes, 1));
+  if (!buf.src || (!in_place && !buf.dst)) return PX_ERR_ALLOC;
+  buf.result = in_place ? buf.src : buf.dst;
   convertIntArrayToByteArray(in, buf.src, call.width(), call.height());
   structIELImage src{call.width(), call.height(), IEL_FORMAT_RGB888, buf.src};
-  structIELImage dst{call.width(), call.height(), IEL_FORMAT_RGB888, buf.dst};
+  structIELImage dst{call.width(), call.height(), IEL_FORMAT_RGB888, buf.result};
   structIELImage tex{call.width(), call.height(), IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(texture)};
   int32_t level = request.level;
   structIELEffectParams params{request.effect, &level, texture ? &tex : nullptr, request.touch_x, request.touch_y};
@@ -174,7 +180,7 @@ jint effect_rgb(Call& call, jintArray in, jintArray out, jint width, jint height
   if (!src || !dst || (texture && !tex)) return PX_ERR_ALLOC;
   RgbBuffers buf;
   jint rc = run_rgb_effect(call, src, tex, buf, request);
-  if (rc == PX_OK) convertByteArraytoIntArray(buf.dst, dst, src, width, height);
+  if (rc == PX_OK) convertByteArraytoIntArray(buf.result, dst, src, width, height);
   return rc;
 }
 
@@ -195,7 +201,7 @@ jint effect_rgb_partial(Call& call, jintArray in, jbyteArray mask, jintArray out
   RgbBuffers buf;
   jint rc = run_rgb_effect(call, src, tex, buf, request);
   if (rc == PX_OK) {
-    convertByteArraytoIntArrayUsingMask(buf.dst, dst, src, reinterpret_cast<unsigned char*>(m), width, height, r);
+    convertByteArraytoIntArrayUsingMask(buf.result, dst, src, reinterpret_cast<unsigned char*>(m), width, height, r);
   }
   return rc;
 }

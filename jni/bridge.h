@@ -95,6 +95,9 @@ struct EffectRequest {
   int32_t level;
   int32_t touch_x = 0;
   int32_t touch_y = 0;
+  // The effect reads each pixel before writing it and nothing else: on the
+  // fast path it runs on one packed RGB buffer in place (half the memory).
+  bool in_place = false;
 };
 
 // Family A: the picture converted to packed RGB, one effect on the copy,

@@ -6,13 +6,13 @@
 
 ENGINE_METHOD(jint, applySepia)(JNIEnv* env, jobject, jintArray in, jintArray out, jint width, jint height) {
   bridge::Call call(env, __func__);
-  return bridge::effect_rgb(call, in, out, width, height, {IEL_EFFECT_SEPIA, 15});
+  return bridge::effect_rgb(call, in, out, width, height, {IEL_EFFECT_SEPIA, 15, 0, 0, true});
 }
 
 ENGINE_METHOD(jint, applySepiaPartial)
 (JNIEnv* env, jobject, jintArray in, jbyteArray mask, jintArray out, jint width, jint height, jobject rect) {
   bridge::Call call(env, __func__);
-  return bridge::effect_rgb_partial(call, in, mask, out, width, height, rect, {IEL_EFFECT_SEPIA, 15});
+  return bridge::effect_rgb_partial(call, in, mask, out, width, height, rect, {IEL_EFFECT_SEPIA, 15, 0, 0, true});
 }
 
 // ---- effects of the effect library: painterly, halftone, kaleidoscope,
@@ -88,7 +88,7 @@ ENGINE_METHOD(jint, applyOilpaint)(JNIEnv* env, jobject, jintArray in, jintArray
 
 ENGINE_METHOD(jint, applyPosterize)(JNIEnv* env, jobject, jintArray in, jintArray out, jint width, jint height) {
   bridge::Call call(env, __func__);
-  return bridge::effect_rgb(call, in, out, width, height, {IEL_EFFECT_POSTERIZE, 0});
+  return bridge::effect_rgb(call, in, out, width, height, {IEL_EFFECT_POSTERIZE, 0, 0, 0, true});
 }
 
 ENGINE_METHOD(jint, applySketch)(JNIEnv* env, jobject, jintArray in, jintArray out, jint width, jint height) {
@@ -134,7 +134,7 @@ ENGINE_METHOD(jint, applyOilpaintPartial)
 ENGINE_METHOD(jint, applyPosterizePartial)
 (JNIEnv* env, jobject, jintArray in, jbyteArray mask, jintArray out, jint width, jint height, jobject rect) {
   bridge::Call call(env, __func__);
-  return bridge::effect_rgb_partial(call, in, mask, out, width, height, rect, {IEL_EFFECT_POSTERIZE, 0});
+  return bridge::effect_rgb_partial(call, in, mask, out, width, height, rect, {IEL_EFFECT_POSTERIZE, 0, 0, 0, true});
 }
 
 ENGINE_METHOD(jint, applySketchPartial)

@@ -4,6 +4,7 @@
 #include "px_auto_adjust.h"
 
 #include <array>
+#include <atomic>
 #include <cstdint>
 
 #include "../kalo/px_mem.h"
@@ -80,6 +81,55 @@ void measure(const int* in, Luma buf, int width, int height) {
       buf.p[i] = (l / 255) * 100;
     }
   });
+}
+
+// The histogram bin of a pixel depends only on s = 218 R + 732 G + 74 B
+// (0..261120) and never falls as s grows, so "bin > 49" is "s >= the first s
+// whose bin passes 49".
+constexpr int32_t kLumaSumMax = 261120;
+int32_t bin_of_sum(int32_t s) { return ((static_cast<int32_t>(static_cast<uint32_t>(s) << 10) / 255) * 100) >> 20; }
+
+int32_t first_bright_sum() {
+  int32_t lo = 0, hi = kLumaSumMax + 1;  // bin_of_sum(hi - 1) = 100 > 49
+  while (lo < hi) {
+    const int32_t mid = lo + (hi - lo) / 2;
+    if (bin_of_sum(mid) > 49) {
+      hi = mid;
+    } else {
+      lo = mid;
+      lo += 1;
+    }
+  }
+  return lo;
+}
+
+// Pixels of bin > 49, counted in row bands without the luminance buffers.
+int32_t count_bright(const int* in, int width, int height) {
+  const int32_t threshold = first_bright_sum();
+  const size_t w = static_cast<size_t>(width);
+  std::atomic<int32_t> bright{0};
+  px_for_rows(height, [&](int y0, int y1) {
+    int32_t count = 0;
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      const uint32_t px = static_cast<uint32_t>(in[i]);
+      const int32_t s = static_cast<int32_t>(218 * ((px >> 16) & 255) + 732 * ((px >> 8) & 255) + 74 * (px & 255));
+      count += s >= threshold ? 1 : 0;
+    }
+    bright.fetch_add(count, std::memory_order_relaxed);
+  });
+  return bright.load();
+}
+
+// One cheap global adjustment for very large pictures, by the share of
+// bright pixels.
+void adjust_large(int* in, int* out, int width, int height, int32_t n, int32_t bright) {
+  if (bright > (n >> 2) * 3) {
+    px_control_brightness_all(in, out, width, height, 9);
+  } else if (bright <= n >> 2) {
+    px_control_brightness_all(in, out, width, height, 11);
+  } else {
+    px_control_contrast_all(in, out, width, height, 12);
+  }
 }
 
 // The tone curve: 51 entries in sixteenths of a percent, entry k for 2k %.
@@ -209,12 +259,19 @@ int log_e_FIX_new(int x) {
   return 21811200;  // x <= 0, 2, 3, 4 and beyond 0x400000: never reached by the adjustment
 }
 
+int px_auto_adjust_bright_sum() { return first_bright_sum(); }
+
 int px_process_hdr(int* in, int* out, int width, int height) {
   const int threshold = g_threshold, cutoff = g_cutoff, weight1 = g_weight1, weight2 = g_weight2;
   // An empty picture has nothing to measure or change.
   if (!in || !out) return PX_ERR_NULL;
   if (width < 1 || height < 1) return PX_OK;
   const int32_t n = width * height;
+  if (n > kLargePicture && !px_scalar_only()) {
+    // The fast path needs only the count of bright pixels: no buffers.
+    adjust_large(in, out, width, height, n, count_bright(in, width, height));
+    return PX_OK;
+  }
   Luma buf{static_cast<int32_t*>(px_calloc(static_cast<size_t>(n), 4)), nullptr};
   if (!buf.l) return PX_ERR_ALLOC;
   buf.p = static_cast<int32_t*>(px_calloc(static_cast<size_t>(n), 4));
@@ -234,14 +291,7 @@ int px_process_hdr(int* in, int* out, int width, int height) {
   }
 
   if (n > kLargePicture) {
-    // One cheap global adjustment for very large pictures.
-    if (bright > (n >> 2) * 3) {
-      px_control_brightness_all(in, out, width, height, 9);
-    } else if (bright <= n >> 2) {
-      px_control_brightness_all(in, out, width, height, 11);
-    } else {
-      px_control_contrast_all(in, out, width, height, 12);
-    }
+    adjust_large(in, out, width, height, n, bright);
     px_free(buf.l);
     px_free(buf.p);
     return PX_OK;

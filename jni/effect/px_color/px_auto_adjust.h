@@ -28,9 +28,13 @@ int log_interp_FIX(const int* table, int v);
 // 21811200 for every other x.
 int log_e_FIX_new(int x);
 
-// 40960; 40961 when a work buffer cannot be allocated (output untouched).
-// `in` may equal `out`.
+// 40960; 40961 when a work buffer cannot be allocated (output untouched;
+// the fast path for large pictures needs none). `in` may equal `out`.
 int px_process_hdr(int* in, int* out, int width, int height);
+
+// The least s = 218 R + 732 G + 74 B whose luminance percentage is 50 or
+// more: the large-picture path counts bright pixels as s >= this.
+int px_auto_adjust_bright_sum();
 
 // Levels remappings over the whole picture. channel: 0 = red, green and
 // blue, 1 = red, 2 = green, 3 = blue; other channels and alpha are copied.

@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "px_fixed.h"
+#include "px_fixed_tables.h"
 #include "px_region.h"
 
 const int LUT_HueValue_Range100[101] = {
@@ -54,15 +55,71 @@ struct HueShift {
   }
 };
 
+// HueShift with the two HSV conversions written out inline, the same
+// arithmetic step for step, so the per-pixel work needs no calls.
+inline int32_t wrap_mul(int32_t a, int32_t b) {
+  return static_cast<int32_t>(static_cast<uint32_t>(a) * static_cast<uint32_t>(b));
+}
+
+struct HueShiftInline {
+  int shift;
+  uint32_t operator()(uint32_t p) const {
+    const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
+              b = static_cast<int>(p & 255);
+    int v = r > g ? r : g;
+    v = b > v ? b : v;
+    int min = r < g ? r : g;
+    min = b < min ? b : min;
+    const int delta = v - min;
+    const int s = static_cast<int>(LUT_DELTA[v & 255] * static_cast<uint32_t>(delta));
+    // Every case is computed and the right one selected: no branches for the
+    // random-looking order in which a picture's pixels take them.
+    const int k = static_cast<int>(LUT_DELTA2[delta & 255]);
+    const fixed from_r = k * (g - b), from_g = itofix(120) + k * (b - r), from_b = itofix(240) + k * (r - g);
+    fixed hf = r == v ? from_r : (g == v ? from_g : from_b);
+    hf += hf < 0 ? itofix(360) : 0;
+    int h = static_cast<int>(static_cast<uint32_t>(fixtoi(hf)) + static_cast<uint32_t>(shift));
+    h += h < 0 ? 360 : (h > 359 ? -360 : 0);
+    const int t = wrap_mul(h, 1092);
+    const int sector = h == 360 ? 0 : t >> 16;
+    const int f = h == 360 ? 0 : t - (sector << 16);
+    const int lo = fixtoi(wrap_mul(v, 65536 - s));
+    const int q = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * (f >> 4)) >> 8)));
+    const int u = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * ((65536 - f) >> 4)) >> 8)));
+    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q.
+    const int ro = sector == 0 || sector == 5 ? v : (sector == 1 ? q : (sector == 4 ? u : lo));
+    const int go = sector == 1 || sector == 2 ? v : (sector == 0 ? u : (sector == 3 ? q : lo));
+    const int bo = sector == 3 || sector == 4 ? v : (sector == 2 ? u : (sector == 5 ? q : lo));
+    const bool keep = v == 0 || s == 0 || sector < 0 || sector > 5;  // grey stays grey
+    return keep ? p : px_argb(p, ro, go, bo);
+  }
+};
+
+// True when no hue 0..360 turned by `shift` lands in a sector (a turn of
+// more than two full circles): every pixel then keeps its colour.
+bool turns_nothing(int shift) {
+  for (int h = 0; h <= 360; ++h) {
+    int h2 = static_cast<int>(static_cast<uint32_t>(h) + static_cast<uint32_t>(shift));
+    h2 += h2 < 0 ? 360 : (h2 > 359 ? -360 : 0);
+    const int sector = hue_sector(h2);
+    if (sector >= 0 && sector <= 5) return false;
+  }
+  return true;
+}
+
 int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, int shift, px_rect rect) {
   if (!in || !out) return PX_ERR_NULL;
-  if (shift == 0) {
+  if (shift == 0 || (!px_scalar_only() && turns_nothing(shift))) {
     if (in != out && width > 0 && height > 0) {
       std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
     }
     return PX_OK;
   }
-  px_region_map(in, mask, out, width, height, rect, HueShift{shift});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, HueShift{shift});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, HueShiftInline{shift});
+  }
   return PX_OK;
 }
 
@@ -113,9 +170,12 @@ struct PointColour {
     int r, g, b;
     unpack(p, &r, &g, &b);
     const Ycc v = to_ycc(r, g, b);
-    if (!keep(v.cb, v.cr)) return px_argb(p, v.y, v.y, v.y);
-    return px_argb(p, px_clamp255(v.y + ((v.cr * 359) >> 8)), px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)),
-                   px_clamp255(v.y + ((v.cb * 454) >> 8)));
+    // Both results, then a select: the loop vectorises.
+    const uint32_t grey = px_argb(p, v.y, v.y, v.y);
+    const uint32_t colour =
+        px_argb(p, px_clamp255(v.y + ((v.cr * 359) >> 8)), px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)),
+                px_clamp255(v.y + ((v.cb * 454) >> 8)));
+    return keep(v.cb, v.cr) ? colour : grey;
   }
 };
 

@@ -39,11 +39,45 @@ void px_region_map(const int* in, const unsigned char* mask, int* out, int width
     px_map_pixels(in, out, width, height, fn);
     return;
   }
-  if (in != out) std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
   const px_rect r = px_rect_clip(rect, width, height);
-  if (px_rect_empty(r)) return;
   const auto* src = reinterpret_cast<const uint32_t*>(in);
   auto* dst = reinterpret_cast<uint32_t*>(out);
+  if (!px_scalar_only()) {
+    // One pass in row bands: each row copied where it lies outside the
+    // rectangle, recomputed where its mask byte is 1.
+    const size_t w = static_cast<size_t>(width);
+    const bool none = px_rect_empty(r);
+    px_for_rows(height, [&](int y0, int y1) {
+      for (int y = y0; y < y1; ++y) {
+        const uint32_t* s = src + static_cast<size_t>(y) * w;
+        uint32_t* d = dst + static_cast<size_t>(y) * w;
+        if (none || y < r.top || y > r.bottom) {
+          if (s != d) std::memcpy(d, s, w * 4);
+          continue;
+        }
+        if (s != d) {
+          std::memcpy(d, s, static_cast<size_t>(r.left) * 4);
+          std::memcpy(d + r.right + 1, s + r.right + 1, (w - static_cast<size_t>(r.right) - 1) * 4);
+        }
+        const unsigned char* m = mask + static_cast<size_t>(y) * w;
+        // Computed for every pixel of the rectangle and then selected, so
+        // the loop has no branch and vectorises; the cost is bounded by the
+        // whole-picture form's.
+        const size_t n = static_cast<size_t>(r.right - r.left) + 1;
+        const uint32_t* sr = s + r.left;
+        const unsigned char* mr = m + r.left;
+        uint32_t* dr = d + r.left;
+        for (size_t x = 0; x < n; ++x) {
+          const uint32_t p = sr[x];
+          const uint32_t v = fn(p);
+          dr[x] = mr[x] == 1 ? v : p;
+        }
+      }
+    });
+    return;
+  }
+  if (in != out) std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  if (px_rect_empty(r)) return;
   for (int y = r.top; y <= r.bottom; ++y) {
     const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
     for (int x = r.left; x <= r.right; ++x) {

@@ -9,167 +9,11 @@
 
 #include "../kalo/if_utils_and.h"
 #include "../kalo/iel/iel.h"
-#include "px_fixed.h"
 #include "px_region.h"
+#include "px_tone_pixels.h"
 
 namespace {
-
-struct Rgb {
-  int r, g, b;
-};
-inline Rgb unpack(uint32_t p) {
-  return {static_cast<int>((p >> 16) & 255), static_cast<int>((p >> 8) & 255), static_cast<int>(p & 255)};
-}
-
-// Luma/chroma with integer weights (arithmetic shifts) and its inverse, each
-// channel clamped to 0..255.
-struct Ycc {
-  int y, cb, cr;
-};
-inline Ycc to_ycc(Rgb c) {
-  return {(77 * c.r + 150 * c.g + 29 * c.b) >> 8, (-43 * c.r - 85 * c.g + 128 * c.b) >> 8,
-          (128 * c.r - 107 * c.g - 21 * c.b) >> 8};
-}
-inline uint32_t from_ycc(uint32_t alpha_source, Ycc v) {
-  return px_argb(alpha_source, px_clamp255(v.y + ((v.cr * 359) >> 8)),
-                 px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)), px_clamp255(v.y + ((v.cb * 454) >> 8)));
-}
-
-// ---- pixel functions -------------------------------------------------------
-
-struct Brightness {
-  int offset;
-  uint32_t operator()(uint32_t p) const {
-    Ycc v = to_ycc(unpack(p));
-    v.y += offset;
-    return from_ycc(p, v);
-  }
-};
-
-struct Temperature {
-  int cb_shift, cr_shift;
-  explicit Temperature(int t) : cb_shift(t - 128), cr_shift((235 - ((858 * t) >> 10)) - 128) {}
-  uint32_t operator()(uint32_t p) const {
-    Ycc v = to_ycc(unpack(p));
-    v.cb += cb_shift;
-    v.cr += cr_shift;
-    return from_ycc(p, v);
-  }
-};
-
-// Saturation matrix in 1/1024: s = 1024 keeps the colour, 0 gives grey.
-struct Saturation {
-  int ra, gc, bb;  // diagonal: a + s, c + s, b + s
-  int a, c, b;
-  explicit Saturation(int s) {
-    int w = 1024 - s;
-    a = (316 * w) >> 10;
-    c = (624 * w) >> 10;
-    b = (84 * w) >> 10;
-    ra = a + s, gc = c + s, bb = b + s;
-  }
-  uint32_t operator()(uint32_t p) const {
-    Rgb x = unpack(p);
-    return px_argb(p, px_clamp255((x.r * ra + x.g * c + x.b * b) >> 10),
-                   px_clamp255((x.r * a + x.g * gc + x.b * b) >> 10),
-                   px_clamp255((x.r * a + x.g * c + x.b * bb) >> 10));
-  }
-};
-
-// A 256-entry curve applied to R, G and B.
-struct Curve {
-  std::array<uint8_t, 256> map;
-  uint32_t operator()(uint32_t p) const {
-    return px_argb(p, map[(p >> 16) & 255], map[(p >> 8) & 255], map[p & 255]);
-  }
-};
-
-// Contrast step of a channel: (c - 128) / 10 rounded away from zero, so every
-// channel but the middle one moves.
-constexpr std::array<int, 256> make_contrast_steps() {
-  std::array<int, 256> t{};
-  for (int c = 0; c < 256; ++c) {
-    int d = c - 128;
-    t[c] = d < 0 ? -((-d + 9) / 10) : (d + 9) / 10;
-  }
-  return t;
-}
-constexpr std::array<int, 256> kContrastStep = make_contrast_steps();
-static_assert(kContrastStep[0] == -13 && kContrastStep[127] == -1 && kContrastStep[128] == 0 &&
-              kContrastStep[129] == 1 && kContrastStep[255] == 13);
-
-// A channel never crosses the middle value.
-inline uint8_t contrast_clamp(int c, int v) {
-  if (c < 128) return static_cast<uint8_t>(v < 0 ? 0 : (v > 128 ? 128 : v));
-  return static_cast<uint8_t>(v < 128 ? 128 : (v > 255 ? 255 : v));
-}
-
-Curve contrast_curve(int k) {
-  Curve curve{};
-  for (int c = 0; c < 256; ++c) curve.map[c] = contrast_clamp(c, c + kContrastStep[c] * k);
-  return curve;
-}
-
-// The 0..100 scale steps in single-precision floats, truncated.
-Curve contrast_curve_range100(int level) {
-  const float k = static_cast<float>(level - 50) * 0.2f;
-  Curve curve{};
-  for (int c = 0; c < 256; ++c) {
-    float v = static_cast<float>(c) + static_cast<float>(kContrastStep[c]) * k;
-    curve.map[c] = contrast_clamp(c, static_cast<int>(v));
-  }
-  return curve;
-}
-
-// Exposure gain: 16.16, 1.0 at level 10; c * gain wraps in 32 bits as on
-// the target.
-Curve exposure_curve(int level) {
-  const fixed gain = itofix(static_cast<int>(static_cast<uint32_t>(level) * 10u)) / 100;
-  Curve curve{};
-  for (int c = 0; c < 256; ++c) {
-    int v = fixtoi(static_cast<fixed>(static_cast<uint32_t>(c) * static_cast<uint32_t>(gain)));
-    curve.map[c] = static_cast<uint8_t>((v > 255 ? 255 : v) & 255);
-  }
-  return curve;
-}
-
-// Faded colour: each channel moves toward a warm, flat tone by f percent.
-struct Faded {
-  int f, g;
-  static int channel(int c, int g, int f, int mul, int add) {
-    int v = (255 * c * g + (mul * c + add) * f) / 25500;
-    return v > 255 ? 255 : (v < 0 ? 0 : v);
-  }
-  uint32_t operator()(uint32_t p) const {
-    Rgb x = unpack(p);
-    return static_cast<uint32_t>(px_pack_rgb888(static_cast<int>(p), channel(x.r, g, f, 141, 26520),
-                                                channel(x.g, g, f, 188, 13260), channel(x.b, g, f, 107, 18360)));
-  }
-};
-
-struct Greyscale {
-  int gain;  // 16.16
-  uint32_t operator()(uint32_t p) const {
-    Rgb x = unpack(p);
-    int m = (x.r + x.g + x.b) / 3;
-    int v = px_clamp255((m * gain) >> 16);  // 32-bit product, wrapping as on the target
-    return px_argb(p, v, v, v);
-  }
-};
-
-// ---- level scales ----------------------------------------------------------
-
-int saturation_of(int level) {
-  int s = 103 * (level - 10) + 1024;
-  return s < 0 ? 0 : (s > 2048 ? 2048 : s);
-}
-int saturation_of_range100(int level) {
-  int s = static_cast<int>(((level - 50) * 103) * 0.2 + 1024.0);
-  return s < 0 ? 0 : (s > 2048 ? 2048 : s);
-}
-int temperature_of(int level) { return (10 - level) * 3 + 128; }
-int temperature_of_range100(int level) { return static_cast<int>((50 - level) * 0.6 + 128.0); }
-int greyscale_gain_of(int level) { return 4000 * (level - 10) + 65536; }
+using namespace px_tone;
 
 // Whole-picture brightness goes through the effect library's variable
 // brightness (a plain per-channel offset); the masked form uses the luma rule.
@@ -227,12 +71,20 @@ int px_control_exposure(int* in, unsigned char* mask, int* out, int width, int h
 
 int px_control_fadedcolor(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
   if (!in || !mask || !out || level > 100) return PX_ERR_NULL;
-  px_region_map(in, mask, out, width, height, rect, Faded{level, 100 - level});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, Faded{level, 100 - level});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, faded_maps(level));
+  }
   return PX_OK;
 }
 
 void px_control_greyscale(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Greyscale{greyscale_gain_of(level)});
+  if (px_scalar_only()) {
+    px_region_map(in, mask, out, width, height, rect, Greyscale{greyscale_gain_of(level)});
+  } else {
+    px_region_map(in, mask, out, width, height, rect, GreyscaleFast{greyscale_gain_of(level)});
+  }
 }
 
 void px_control_brightness_all(int* in, int* out, int width, int height, int level) {
@@ -249,7 +101,11 @@ void px_control_temperature_all(int* in, int* out, int width, int height, int le
 }
 int px_control_fadedcolor_all(int* in, int* out, int width, int height, int level) {
   if (!in || !out || level > 100) return PX_ERR_NULL;
-  px_map_pixels(in, out, width, height, Faded{level, 100 - level});
+  if (px_scalar_only()) {
+    px_map_pixels(in, out, width, height, Faded{level, 100 - level});
+  } else {
+    px_map_pixels(in, out, width, height, faded_maps(level));
+  }
   return PX_OK;
 }
 int px_control_exposure_all(int* in, int* out, int width, int height, int level) {

@@ -5,39 +5,78 @@
 #include "../px_color/px_hue.h"
 #include "../px_color/px_region.h"
 #include "../px_color/px_tone.h"
+#include "../px_color/px_tone_pixels.h"
 #include "px_filter.h"
 #include "px_filter_internal.h"
 
-void px_blend_texture_with_screen(int* image, int* out, int* texture, int width, int height) {
-  px_filter::map2(image, texture, out, width, height, [](uint32_t p, uint32_t t) -> uint32_t {
-    if ((p >> 24) == 0) return 0;
-    uint32_t o = p & 0xFF000000u;
-    for (int s = 0; s <= 16; s += 8) {
-      const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
-      o |= (255u - (((255u - c) * (255u - k)) >> 8)) << s;  // divides by 256: 0 with 0 gives 1
-    }
-    return o;
+namespace {
+using namespace px_tone;
+
+// Each channel written out (no loop over the channel shifts), so the
+// fused loop below needs no inner loop.
+inline uint32_t screen_channel(uint32_t p, uint32_t t, int s) {
+  const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+  return (255u - (((255u - c) * (255u - k)) >> 8)) << s;  // divides by 256: 0 with 0 gives 1
+}
+
+inline uint32_t screen_pixel(uint32_t p, uint32_t t) {
+  if ((p >> 24) == 0) return 0;
+  return (p & 0xFF000000u) | screen_channel(p, t, 16) | screen_channel(p, t, 8) | screen_channel(p, t, 0);
+}
+
+inline uint32_t overlay_channel(uint32_t p, uint32_t t, int s) {
+  const uint32_t ia = p >> 24, ta = t >> 24;
+  const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
+  const uint32_t v = c < 128 ? (k * c) >> 7 : 255u - (((255u - k) * (255u - c)) >> 7);
+  // The mix weight of the picture is ta XOR ia (255 - ta when opaque).
+  // For a translucent picture the sum can pass 255; it is held at 255.
+  const uint32_t m = (ta * v + c * (ta ^ ia)) >> 8;
+  return (m > 255u ? 255u : m) << s;
+}
+
+inline uint32_t overlay_pixel(uint32_t p, uint32_t t) {
+  if ((p >> 24) == 0) return 0;
+  return (p & 0xFF000000u) | overlay_channel(p, t, 16) | overlay_channel(p, t, 8) | overlay_channel(p, t, 0);
+}
+
+// Dawn cast in one pass: brightness, then contrast, exposure and RGB balance
+// composed into one map per channel, saturation, the screen texture and the
+// overlay texture. Only when neither texture is the output array, whose
+// pixels the step-by-step form overwrites before it reads the textures.
+bool dawncast_fused(const int* in, int* out, const int* overlay, const int* screen, int width, int height) {
+  if (px_scalar_only() || !in || !out || !overlay || !screen || overlay == out || screen == out) return false;
+  if (width <= 0 || height <= 0) return true;
+  const ChannelMaps tones = channel_maps_of([](int* i, int* o, int w, int h) {
+    px_control_contrast_all(i, o, w, h, 13);
+    px_control_exposure_all(o, o, w, h, 8);
+    px_adjust_RGB_all(o, o, w, h, 11, 10, 10);
   });
+  const Saturation s9(saturation_of(9));
+  const Brightness b9{-10};
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  const auto* ov = reinterpret_cast<const uint32_t*>(overlay);
+  const auto* sc = reinterpret_cast<const uint32_t*>(screen);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      dst[i] = overlay_pixel(screen_pixel(s9(tones(b9(src[i]))), sc[i]), ov[i]);
+    }
+  });
+  return true;
+}
+}  // namespace
+
+void px_blend_texture_with_screen(int* image, int* out, int* texture, int width, int height) {
+  px_filter::map2(image, texture, out, width, height, screen_pixel);
 }
 
 void px_blend_texture_with_overlay(int* image, int* out, int* texture, int width, int height) {
-  px_filter::map2(image, texture, out, width, height, [](uint32_t p, uint32_t t) -> uint32_t {
-    const uint32_t ia = p >> 24, ta = t >> 24;
-    if (ia == 0) return 0;
-    uint32_t o = p & 0xFF000000u;
-    for (int s = 0; s <= 16; s += 8) {
-      const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
-      const uint32_t v = c < 128 ? (k * c) >> 7 : 255u - (((255u - k) * (255u - c)) >> 7);
-      // The mix weight of the picture is ta XOR ia (255 - ta when opaque).
-      // For a translucent picture the sum can pass 255; it is held at 255.
-      const uint32_t m = (ta * v + c * (ta ^ ia)) >> 8;
-      o |= (m > 255u ? 255u : m) << s;
-    }
-    return o;
-  });
+  px_filter::map2(image, texture, out, width, height, overlay_pixel);
 }
 
 void px_apply_dawncast_texture(int* in, int* out, int* overlay, int* screen, int width, int height) {
+  if (dawncast_fused(in, out, overlay, screen, width, height)) return;
   px_control_brightness_all(in, out, width, height, 9);
   px_control_contrast_all(out, out, width, height, 13);
   px_control_exposure_all(out, out, width, height, 8);

@@ -11,12 +11,32 @@
 #include "../px_color/px_hue.h"
 #include "../px_color/px_region.h"
 #include "../px_color/px_tone.h"
+#include "../px_color/px_tone_pixels.h"
 #include "px_filter.h"
 #include "px_filter_internal.h"
 
 // ---- recipes ---------------------------------------------------------------
 
+namespace {
+using namespace px_tone;
+
+// Retro in one pass: the seven steps below composed per pixel, each in its
+// table-free form, so the loop vectorises.
+void retro_fused(int* in, int* out, int width, int height) {
+  const Saturation s5(saturation_of(5)), s7(saturation_of(7));
+  const FadedArith faded{50, 50};
+  const ContrastArith c9{-1}, c12{2};
+  px_map_pixels(in, out, width, height, [&](uint32_t p) {
+    return c12(Brightness{10}(c9(s7(faded(Brightness{20}(s5(p)))))));
+  });
+}
+}  // namespace
+
 void px_apply_retro(int* in, int* out, int width, int height) {
+  if (!px_scalar_only()) {
+    retro_fused(in, out, width, height);
+    return;
+  }
   px_control_saturation_all(in, out, width, height, 5);
   px_control_brightness_all(out, out, width, height, 12);
   px_control_fadedcolor_all(out, out, width, height, 50);
@@ -92,31 +112,72 @@ void px_apply_greyscale_all(int* in, int* out, int width, int height) {
   });
 }
 
+namespace {
+// The vignette's darkening: factor f(x, y) in 20 fractional bits, applied to
+// each channel with the shifts below.
+struct Vignette {
+  int hx, hy;
+  int64_t kx, ky;
+  Vignette(int width, int height)
+      : hx(width >> 1),
+        hy(height >> 1),
+        kx((int64_t{1} << 28) / (static_cast<int64_t>(hx) * hx)),
+        ky((int64_t{1} << 28) / (static_cast<int64_t>(hy) * hy)) {}
+  int64_t row(int y) const {
+    const int64_t dy = y - hy;
+    return (int64_t{1} << 28) - ((7 * ky * dy * dy) >> 4);
+  }
+  uint32_t factor(int64_t fy, int x) const {
+    const int64_t dx = x - hx;
+    return static_cast<uint32_t>((fy - ((7 * kx * dx * dx) >> 4)) >> 8);  // 2^20 is one
+  }
+  static uint32_t apply(uint32_t p, uint32_t f) {
+    const uint32_t b = ((p & 255u) * f << 4) >> 24;
+    const uint32_t r = ((((p >> 16) & 255u) * f) >> 4) & 0x00FF0000u;
+    const uint32_t g = ((((p >> 8) & 255u) * f) >> 12) & 0x0000FF00u;
+    return (p & 0xFF000000u) | r | g | b;
+  }
+};
+
+// out = after(vignette(before(in))) over the picture in row bands; a picture
+// under 2 x 2 has no vignette.
+template <class Before, class After>
+void vignette_between(const int* in, int* out, int width, int height, Before before, After after) {
+  const auto* src = reinterpret_cast<const uint32_t*>(in);
+  auto* dst = reinterpret_cast<uint32_t*>(out);
+  const size_t w = static_cast<size_t>(width);
+  if (width < 2 || height < 2) {
+    px_map_pixels(in, out, width, height, [&](uint32_t p) { return after(before(p)); });
+    return;
+  }
+  const Vignette v(width, height);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const int64_t fy = v.row(y);
+      const uint32_t* s = src + static_cast<size_t>(y) * w;
+      uint32_t* d = dst + static_cast<size_t>(y) * w;
+      for (int x = 0; x < width; ++x) d[x] = after(Vignette::apply(before(s[x]), v.factor(fy, x)));
+    }
+  });
+}
+}  // namespace
+
 void px_apply_vignette(int* in, int* out, int width, int height) {
   if (!in || !out || width <= 0 || height <= 0) return;
   if (width < 2 || height < 2) {
     if (in != out) std::memmove(out, in, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
     return;
   }
-  const int hx = width >> 1, hy = height >> 1;
-  const int64_t kx = (int64_t{1} << 28) / (static_cast<int64_t>(hx) * hx);
-  const int64_t ky = (int64_t{1} << 28) / (static_cast<int64_t>(hy) * hy);
+  const Vignette v(width, height);
   const auto* src = reinterpret_cast<const uint32_t*>(in);
   auto* dst = reinterpret_cast<uint32_t*>(out);
   const size_t w = static_cast<size_t>(width);
   px_for_rows(height, [&](int y0, int y1) {
     for (int y = y0; y < y1; ++y) {
-      const int64_t dy = y - hy;
-      const int64_t fy = (int64_t{1} << 28) - ((7 * ky * dy * dy) >> 4);
+      const int64_t fy = v.row(y);
       for (int x = 0; x < width; ++x) {
-        const int64_t dx = x - hx;
-        const uint32_t f = static_cast<uint32_t>((fy - ((7 * kx * dx * dx) >> 4)) >> 8);  // 2^20 is one
         const size_t i = static_cast<size_t>(y) * w + static_cast<size_t>(x);
-        const uint32_t p = src[i];
-        const uint32_t b = ((p & 255u) * f << 4) >> 24;
-        const uint32_t r = ((((p >> 16) & 255u) * f) >> 4) & 0x00FF0000u;
-        const uint32_t g = ((((p >> 8) & 255u) * f) >> 12) & 0x0000FF00u;
-        dst[i] = (p & 0xFF000000u) | r | g | b;
+        dst[i] = Vignette::apply(src[i], v.factor(fy, x));
       }
     }
   });
@@ -152,7 +213,51 @@ void vintage_tones(int* in, int* out, int w, int h) {
 }
 }  // namespace
 
+namespace {
+// The vintage colours in one pass: the per-channel steps before and after
+// the brightness step composed into one map each, then (for the finished
+// picture) the vignette and the saturation step.
+struct VintageMaps {
+  ChannelMaps before, after;
+};
+VintageMaps vintage_maps() {
+  VintageMaps m;
+  m.before = channel_maps_of([](int* in, int* out, int w, int h) {
+    control_gamma(in, out, w, h, 0, 0.77);
+    changeHistogramByInput(out, out, w, h, 1, 28, 255);
+    control_gamma(out, out, w, h, 1, 1.09);
+    control_gamma(out, out, w, h, 2, 1.06);
+    control_gamma(out, out, w, h, 3, 1.15);
+    changeHistogramByOutput(out, out, w, h, 3, 45, 255);
+  });
+  m.after = channel_maps_of([](int* in, int* out, int w, int h) {
+    px_control_contrast_all(in, out, w, h, 12);
+    changeHistogramByInput(out, out, w, h, 0, 15, 243);
+    control_gamma(out, out, w, h, 0, 1.03);
+    changeHistogramByOutput(out, out, w, h, 0, 0, 238);
+    changeHistogramByInput(out, out, w, h, 1, 49, 255);
+    control_gamma(out, out, w, h, 1, 2.35);
+    changeHistogramByOutput(out, out, w, h, 1, 11, 232);
+    control_gamma(out, out, w, h, 2, 1.15);
+    changeHistogramByOutput(out, out, w, h, 2, 0, 250);
+    control_gamma(out, out, w, h, 3, 0.58);
+    changeHistogramByOutput(out, out, w, h, 3, 56, 238);
+    px_control_contrast_all(out, out, w, h, 12);
+    changeHistogramByOutput(out, out, w, h, 3, 0, 241);
+    changeHistogramByOutput(out, out, w, h, 3, 14, 255);
+  });
+  return m;
+}
+}  // namespace
+
 void px_apply_vintage(int* in, int* out, int width, int height) {
+  if (!px_scalar_only() && in && out && width > 0 && height > 0) {
+    const VintageMaps m = vintage_maps();
+    const Saturation s3(saturation_of(3));
+    vignette_between(in, out, width, height, [&](uint32_t p) { return m.after(Brightness{20}(m.before(p))); },
+                     [&](uint32_t p) { return s3(p); });
+    return;
+  }
   vintage_tones(in, out, width, height);
   px_apply_vignette(out, out, width, height);
   px_control_saturation_all(out, out, width, height, 3);
@@ -163,6 +268,12 @@ void px_apply_vintage(int* in, int* out, int width, int height) {
 // on the wrong edges; the vignette belongs to the finished picture. The
 // centre pixel, where the vignette is neutral, matches px_apply_vintage.
 void px_apply_vintage_prev(int* in, int* out, int width, int height) {
+  if (!px_scalar_only() && in && out) {
+    const VintageMaps m = vintage_maps();
+    const Saturation s3(saturation_of(3));
+    px_map_pixels(in, out, width, height, [&](uint32_t p) { return s3(m.after(Brightness{20}(m.before(p)))); });
+    return;
+  }
   vintage_tones(in, out, width, height);
   px_control_saturation_all(out, out, width, height, 3);
 }

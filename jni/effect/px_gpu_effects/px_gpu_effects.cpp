@@ -154,12 +154,68 @@ double row_distance(int y, int height) { return height > 1 ? 2.0 * y / (height -
 // (0.92 v, 0.95 v, v). Redness rd = smoothstep(0.25, 0.45, r - max(g, b))
 // step(0.35, r) (true reds only: skin and orange stay grey) mixes in the crimson (0.15 + 0.75 r, 0.02, 0.06). A heavy frame darkens by
 // 1 - 0.7 smoothstep(0.5, 1.35, length(u, v)) on the -1..1 scale.
+//
+// The fast path does the same arithmetic with less of it: channel / 255 and
+// each column's distance from a table, the redness only where step(0.35, r)
+// lets it count (elsewhere rd = 0 and the mix gives the grey exactly), and
+// no frame where length^2 <= 0.25 (there the smoothstep is 0 and the frame
+// exactly 1). `dx2` becomes the column distances.
+// smoothstep and the channel write of the helpers above, in forms the
+// compiler inlines into the pixel loop (the same operations).
+inline double smoothstep_inline(double e0, double e1, double x) {
+  const float a = static_cast<float>((x - e0) / (e1 - e0));
+  const float m = a > 0.0f ? a : 0.0f;
+  const double t = m < 1.0f ? m : 1.0f;
+  return t * t * (3.0 - 2.0 * t);
+}
+inline uint32_t channel_inline(double v) {
+  const float a = static_cast<float>(v * 255.0);
+  const float m = a > 0.0f ? a : 0.0f;  // NaN gives 0
+  return static_cast<uint32_t>(static_cast<int32_t>(m < 255.0f ? m : 255.0f));
+}
+
+void gothicnoir_fast(const int* in, int* out, int width, int height, double* dx2) {
+  double unit[256];
+  for (int i = 0; i < 256; ++i) unit[i] = static_cast<uint32_t>(i) / 255.0;
+  for (int x = 0; x < width; ++x) dx2[x] = std::sqrt(dx2[x]);
+  const double* dx = dx2;
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const double dy = row_distance(y, height);
+      const size_t row = static_cast<size_t>(y) * w;
+      for (int x = 0; x < width; ++x) {
+        const uint32_t p = static_cast<uint32_t>(in[row + x]);
+        const Col c{unit[(p >> 16) & 255], unit[(p >> 8) & 255], unit[p & 255]};
+        const double v = smoothstep_inline(0.12, 0.78, luma(c));
+        Col o{0.92 * v, 0.95 * v, v};
+        if (c.r >= 0.35) {
+          const double rd = smoothstep_inline(0.25, 0.45, c.r - std::fmax(c.g, c.b));
+          o = mix(o, {0.15 + 0.75 * c.r, 0.02, 0.06}, rd);
+        }
+        const double d2 = dx[x] * dx[x] + dy * dy;
+        if (d2 > 0.25) {
+          const double frame = 1.0 - 0.7 * smoothstep_inline(0.5, 1.35, std::sqrt(d2));
+          o = {o.r * frame, o.g * frame, o.b * frame};
+        }
+        out[row + x] = static_cast<int>((p & 0xFF000000u) | channel_inline(o.r) << 16 | channel_inline(o.g) << 8 |
+                                        channel_inline(o.b));
+      }
+    }
+  });
+}
+
 bool gothicnoir(int* in, int* out, int width, int height) {
   if (!usable(in, out, width, height)) return false;
   double* dx2 = column_distances(width);
   if (!dx2) {
     IF_ERROR("GothicNoir effect: Low memory\n");
     return false;
+  }
+  if (!px_scalar_only()) {
+    gothicnoir_fast(in, out, width, height, dx2);
+    IF_FREE(dx2);
+    return true;
   }
   each_pixel(width, height, [&](int x, int y, size_t i) {
     const uint32_t p = static_cast<uint32_t>(in[i]);

@@ -252,6 +252,8 @@ int IEL_PosterizeNew(structIELImage* input, structIELImage* output) {
   const unsigned char* src = input->buffer;
   unsigned char* dst = output->buffer;
   const size_t row = static_cast<size_t>(w) * bpp;
+  // Packed RGB on the fast path: every byte of a row through the levels.
+  const bool bytewise = bpp == 3 && !px_scalar_only();
   px_for_rows(
       h,
       [&](int y0, int y1) {
@@ -262,6 +264,11 @@ int IEL_PosterizeNew(structIELImage* input, structIELImage* output) {
           }
           const unsigned char* p = src + y * row;
           unsigned char* o = dst + y * row;
+          if (bytewise) {
+            for (size_t i = 0; i < row; ++i) o[i] = static_cast<unsigned char>(level[p[i]]);
+            progress.advance();
+            continue;
+          }
           for (int x = 0; x < w; ++x, p += bpp, o += bpp) {
             int c[4] = {};
             read_channels(p, bpp, c);

@@ -6,9 +6,7 @@
 #include "iel_effects.h"
 #include "iel_internal.h"
 #include "iel_luma.h"
-
-namespace {
-}  // namespace
+#include "../px_parallel.h"
 
 int IEL_SepiaFast(structIELImage* input, structIELImage* output, int level) {
   IELProgressScope progress;
@@ -21,36 +19,40 @@ int IEL_SepiaFast(structIELImage* input, structIELImage* output, int level) {
     level = 50;
   }
   const int bpp = IEL_BytesPerPixel(input->format);
-  const long long count = static_cast<long long>(input->width) * input->height;
+  const size_t width = static_cast<size_t>(input->width);
   const int ceiling = 255 - level / 2;
-  const unsigned char* src = input->buffer;
-  unsigned char* dst = output->buffer;
-  progress.start(static_cast<uint32_t>(input->height));
-  for (long long i = 0; i < count; ++i, src += bpp, dst += bpp) {
-    int r, g, b;
-    uint16_t word = 0;
-    if (bpp == 2) {
-      std::memcpy(&word, src, 2);
-      r = (word & 0xF800) >> 8;
-      g = (word & 0x07E0) >> 3;
-      b = (word << 3) & 0xF8;
-    } else {
-      r = src[0], g = src[1], b = src[2];
-    }
-    int y = IEL_Luma(r, g, b) & 255;
-    y = y < level ? level : (y > ceiling ? ceiling : y);
-    int rr = y + 16 > 255 ? 255 : y + 16;
-    int gg = y - 3 < 0 ? 0 : y - 3;
-    int bb = y - 34 < 0 ? 0 : y - 34;
-    if (bpp == 2) {
-      word = static_cast<uint16_t>((rr & 0xF8) << 8 | (gg & 0xFC) << 3 | bb >> 3);
-      std::memcpy(dst, &word, 2);
-    } else {
-      dst[0] = static_cast<unsigned char>(rr);
-      dst[1] = static_cast<unsigned char>(gg);
-      dst[2] = static_cast<unsigned char>(bb);
-    }
+  // The tone of each luma, once per call.
+  uint8_t tone[256][3];
+  for (int v = 0; v < 256; ++v) {
+    const int y = v < level ? level : (v > ceiling ? ceiling : v);
+    tone[v][0] = static_cast<uint8_t>(y + 16 > 255 ? 255 : y + 16);
+    tone[v][1] = static_cast<uint8_t>(y - 3 < 0 ? 0 : y - 3);
+    tone[v][2] = static_cast<uint8_t>(y - 34 < 0 ? 0 : y - 34);
   }
+  const unsigned char* in = input->buffer;
+  unsigned char* out = output->buffer;
+  progress.start(static_cast<uint32_t>(input->height));
+  px_for_rows(input->height, [&](int y0, int y1) {
+    const size_t i0 = static_cast<size_t>(y0) * width, i1 = static_cast<size_t>(y1) * width;
+    if (bpp == 2) {
+      for (size_t i = i0; i < i1; ++i) {
+        uint16_t word = 0;
+        std::memcpy(&word, in + 2 * i, 2);
+        const uint8_t* t = tone[IEL_Luma((word & 0xF800) >> 8, (word & 0x07E0) >> 3, (word << 3) & 0xF8) & 255];
+        word = static_cast<uint16_t>((t[0] & 0xF8) << 8 | (t[1] & 0xFC) << 3 | t[2] >> 3);
+        std::memcpy(out + 2 * i, &word, 2);
+      }
+      return;
+    }
+    const unsigned char* src = in + i0 * bpp;
+    unsigned char* dst = out + i0 * bpp;
+    for (size_t i = i0; i < i1; ++i, src += bpp, dst += bpp) {
+      const uint8_t* t = tone[IEL_Luma(src[0], src[1], src[2]) & 255];
+      dst[0] = t[0];
+      dst[1] = t[1];
+      dst[2] = t[2];
+    }
+  });
   progress.advance(static_cast<uint32_t>(input->height));
   return IEL_OK;
 }
@@ -62,12 +64,14 @@ int IEL_VariableBrightness_ARGB8888(structIELImage* input, structIELImage* outpu
   }
   uint32_t table[256];
   for (int i = 0; i < 256; ++i) table[i] = static_cast<uint32_t>(px_clamp255(i + level));
-  const long long count = static_cast<long long>(input->width) * input->height;
   const auto* src = reinterpret_cast<const uint32_t*>(input->buffer);
   auto* dst = reinterpret_cast<uint32_t*>(output->buffer);
-  for (long long i = 0; i < count; ++i) {
-    uint32_t p = src[i];
-    dst[i] = (p & 0xFF000000u) | table[(p >> 16) & 255] << 16 | table[(p >> 8) & 255] << 8 | table[p & 255];
-  }
+  const size_t w = static_cast<size_t>(input->width);
+  px_for_rows(input->height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      const uint32_t p = src[i];
+      dst[i] = (p & 0xFF000000u) | table[(p >> 16) & 255] << 16 | table[(p >> 8) & 255] << 8 | table[p & 255];
+    }
+  });
   return IEL_OK;
 }

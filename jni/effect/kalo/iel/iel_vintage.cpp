@@ -4,6 +4,7 @@
 #include <cstdint>
 
 #include "../if_utils_and.h"
+#include "../px_parallel.h"
 #include "iel_artistic.h"
 #include "iel_internal.h"
 
@@ -67,11 +68,13 @@ int IEL_Vintage_ARGB_Pack(const uint32_t* input, uint32_t* output, int width, in
   }
   uint8_t r[256], g[256], b[256];
   IEL_Vintage_Curves(r, g, b);
-  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
-  for (size_t i = 0; i < n; ++i) {
-    const uint32_t p = input[i];
-    output[i] = (p & 0xFF000000u) | static_cast<uint32_t>(r[(p >> 16) & 255]) << 16 |
-                static_cast<uint32_t>(g[(p >> 8) & 255]) << 8 | b[p & 255];
-  }
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; ++i) {
+      const uint32_t p = input[i];
+      output[i] = (p & 0xFF000000u) | static_cast<uint32_t>(r[(p >> 16) & 255]) << 16 |
+                  static_cast<uint32_t>(g[(p >> 8) & 255]) << 8 | b[p & 255];
+    }
+  });
   return IEL_OK;
 }

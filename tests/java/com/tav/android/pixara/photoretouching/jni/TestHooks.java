@@ -1,6 +1,6 @@
 package com.tav.android.pixara.photoretouching.jni;
 
-/** The engine's allocation failure hook and block count, from the test-only library. */
+/** The engine's allocation failure hook, block count and scalar switch, from the test-only library. */
 final class TestHooks {
     static {
         System.loadLibrary("glimmerEngine");
@@ -18,4 +18,10 @@ final class TestHooks {
 
     /** Blocks the engine has handed out and not yet freed. */
     static native long liveBlocks();
+
+    /** Forces the plain single-threaded path (true) or lets the fast paths run. */
+    static native void setScalarOnly(boolean on);
+
+    /** Whether the plain path is forced. */
+    static native boolean scalarOnly();
 }
