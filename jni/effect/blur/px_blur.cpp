@@ -439,8 +439,13 @@ void px_destroy_tiltshift() {
 
 // ---- out-focus ---------------------------------------------------------------------
 
+int px_blur_outfocus_radius(int level) { return kOutfocusRadius[level < 0 ? 0 : (level > 7 ? 7 : level)]; }
+
 int px_blur_outfocus(int* src, int* dst, int width, int height, int level) {
-  int radius = kOutfocusRadius[level < 0 ? 0 : (level > 7 ? 7 : level)];
+  return px_blur_variable(src, dst, width, height, px_blur_outfocus_radius(level));
+}
+
+int px_blur_variable(int* src, int* dst, int width, int height, int radius) {
   structIELImage in{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(src)};
   structIELImage out{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(dst)};
   structIELEffectParams params{IEL_EFFECT_VARIABLE_BLUR, &radius, nullptr, 0, 0};

@@ -70,6 +70,10 @@ void px_destroy_tiltshift();
 // radius 3, 7, 15, 31, 41, 49, 55, 63 of level 0..7 (levels above 7 use 63,
 // negative levels 3). Returns the effect library's result code.
 int px_blur_outfocus(int* src, int* dst, int width, int height, int level);
+// The radius of an out-focus level, and the variable blur at any radius
+// (through the effect library, as px_blur_outfocus).
+int px_blur_outfocus_radius(int level);
+int px_blur_variable(int* src, int* dst, int width, int height, int radius);
 
 // ---- steps, exposed for the tests --------------------------------------------
 
