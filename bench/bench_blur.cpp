@@ -5,6 +5,7 @@
 
 #include "bench_picture.h"
 
+#include <cstring>
 #include <random>
 #include <vector>
 
@@ -33,6 +34,12 @@ void run(benchmark::State& state, Op op) {
   picture(static_cast<int>(state.range(0)));
   bench_run(state, op);
 }
+
+// The floor: memcpy of the same picture.
+void Memcpy(benchmark::State& s) {
+  bench_run(s, [](Picture& p) { std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4); });
+}
+BENCHMARK(Memcpy)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 void ApplyBlur(benchmark::State& s) {
   run(s, [](Picture& p) {

@@ -4,9 +4,11 @@
 #include <benchmark/benchmark.h>
 
 #include <cstdio>
+#include <cstring>
 #include <string>
 #include <vector>
 
+#include "bench_picture.h"
 #include "effect/portrait/px_portrait.h"
 
 namespace {
@@ -105,6 +107,12 @@ void OutfocusPreview(benchmark::State& s) {
                                                p.height / 4, 5);
   });
 }
+
+// The floor: memcpy of the 12 MP picture.
+void Memcpy(benchmark::State& s) {
+  bench_run(s, [](BenchPicture& p) { std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4); });
+}
+BENCHMARK(Memcpy)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 #define PORTRAIT_BENCH(name) BENCHMARK(name)->Arg(3)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 PORTRAIT_BENCH(Analyse)

@@ -391,7 +391,8 @@ TEST(VariableBlur, ConstantStaysConstantAndRadiusZeroCopies) {
 
 TEST(VariableBlur, SameResultForAnyThreadCountAndInPlace) {
   const bool was = px_scalar_only();
-  for (auto [w, h] : {std::pair{517, 389}, {16, 900}, {1000, 3}}) {
+  // Stripes of eight columns with columns left over, one row, one column.
+  for (auto [w, h] : {std::pair{517, 389}, {16, 900}, {1000, 3}, {1, 77}, {77, 1}, {13, 5}}) {
     for (int radius : {3, 15, 63}) {
       std::vector<int> in = random_picture(w, h, 23 + radius), fast(in.size()), scalar(in.size());
       px_set_scalar_only(false);
@@ -406,6 +407,33 @@ TEST(VariableBlur, SameResultForAnyThreadCountAndInPlace) {
     }
   }
   px_set_scalar_only(was);
+}
+
+TEST(VariableBlur, BoxesDivideOnceAndLargeRadiiStopAt300) {
+  // Radius 3: boxes of radius 1, 1, 1 (N = 27), whose kernel is 1, 3, 6, 7,
+  // 6, 3, 1. An impulse of 255, each value rounded once: 255 * 7 / 27 = 66.1
+  // -> 66, 255 * 6 / 27 = 56.7 -> 57, 255 * 3 / 27 = 28.3 -> 28, 255 / 27 =
+  // 9.4 -> 9. (A picture of one row: the vertical direction repeats the row
+  // and changes nothing.)
+  std::vector<int> in(11, rgb(0, 0, 0, 0x10)), out(11);
+  in[5] = rgb(255, 0, 0, 0x20);
+  ASSERT_EQ(variable_blur(in, out, 11, 1, 3), IEL_OK);
+  const int expect[11] = {0, 0, 9, 28, 57, 66, 57, 28, 9, 0, 0};
+  for (int x = 0; x < 11; ++x) EXPECT_EQ(chan(out[x], 0), expect[x]) << x;
+  EXPECT_EQ(static_cast<uint32_t>(out[5]) >> 24, 0x20u);
+  EXPECT_EQ(static_cast<uint32_t>(out[4]) >> 24, 0x10u);
+  // Radii above 300 blur as 300.
+  std::vector<int> pic = random_picture(23, 9, 5), a(pic.size()), b(pic.size());
+  ASSERT_EQ(variable_blur(pic, a, 23, 9, 300), IEL_OK);
+  ASSERT_EQ(variable_blur(pic, b, 23, 9, 5000), IEL_OK);
+  EXPECT_EQ(a, b);
+  // A picture of one constant channel per half keeps its extremes within.
+  std::vector<int> halves(40 * 3), blurred(halves.size());
+  for (int i = 0; i < 120; ++i) halves[i] = (i % 40) < 20 ? rgb(0, 10, 250) : rgb(255, 10, 0);
+  ASSERT_EQ(variable_blur(halves, blurred, 40, 3, 9), IEL_OK);
+  for (int i = 0; i < 120; ++i) EXPECT_EQ(chan(blurred[i], 1), 10);
+  EXPECT_EQ(chan(blurred[0], 0), 0);
+  EXPECT_EQ(chan(blurred[39], 0), 255);
 }
 
 TEST(VariableBlur, KeptOddities) {

@@ -6,18 +6,25 @@
 // b2 = (r + 1) / 3, b3 = r / 3), so the combined kernel reaches exactly r
 // pixels on each side and, being the convolution of three boxes, is close to
 // a Gaussian of sigma about r / 3. Each box is a running sum (one add and one
-// subtract per pixel whatever its size); the picture's border pixels are
-// repeated beyond the edge. Values travel as 8.8 fixed point between the
-// boxes of one direction (each box rounds to nearest); they are rounded to
-// whole 0..255 values once between the horizontal and the vertical
-// direction, when the horizontal result is stored in the output.
+// subtract per value whatever its size); every box repeats the border values
+// of its own input beyond the edge. The sums are not divided between the
+// boxes: the third box's sum is the exact weighted sum of the 8-bit input,
+// divided once by N = (2 b1 + 1)(2 b2 + 1)(2 b3 + 1) and rounded (a
+// multiplication by the 32-bit reciprocal rounded up, which gives every
+// constant picture back exactly). So each direction rounds once, and the
+// horizontal result is stored as 8-bit values before the vertical direction.
+// Sums stay below 2^31 because N is kept at most 2^23: radii above
+// kMaxRadius blur as kMaxRadius.
 //
-// Threads: the horizontal direction splits rows over worker threads, the
-// vertical direction splits the picture into fixed stripes of 16 columns and
-// hands stripes to worker threads. Every row or stripe is computed the same
-// way whichever thread takes it, so the result does not depend on the number
-// of threads (nor on GLIMMER_SCALAR). Alpha is kept from the input. The
-// output may be the input itself.
+// Lanes: a pixel's four bytes are four lanes (the alpha lane is summed too
+// and thrown away: the result keeps the input's alpha), so a box step is one
+// add and one subtract on a pixel's worth of lanes. The horizontal direction
+// runs along each row (rows on worker threads); the vertical direction runs
+// down stripes of kStripe columns, 4 * kStripe lanes side by side (stripes
+// on worker threads; the last columns that do not fill a stripe run one by
+// one). Every row or stripe is computed the same way whichever thread takes
+// it, so the result does not depend on the number of threads (nor on
+// GLIMMER_SCALAR). The output may be the input itself.
 #include <atomic>
 #include <cstdint>
 #include <cstring>
@@ -28,77 +35,103 @@
 #include "iel_internal.h"
 
 namespace {
-constexpr int kStripe = 16;          // columns of one vertical stripe
-constexpr int kLanes = kStripe * 3;  // R, G, B of each stripe column
-constexpr int kMaxBox = 8191;        // keeps a running sum of 8.8 values in 32 bits
+constexpr int kStripe = 8;              // columns of one vertical stripe
+constexpr int kMaxLanes = 4 * kStripe;  // lanes of one position
+constexpr int kMaxRadius = 300;         // (2 * 100 + 1)^3 < 2^23
 
 struct Boxes {
   int b[3];
+  uint32_t half;        // N / 2
+  uint32_t reciprocal;  // ceil(2^32 / N)
 };
 
 Boxes boxes_of(int radius) {
-  if (radius > 3 * kMaxBox) radius = 3 * kMaxBox;
-  return {{(radius + 2) / 3, (radius + 1) / 3, radius / 3}};
+  if (radius > kMaxRadius) radius = kMaxRadius;
+  Boxes boxes{{(radius + 2) / 3, (radius + 1) / 3, radius / 3}, 0, 0};
+  uint64_t n = 1;
+  for (int b : boxes.b) n *= 2 * static_cast<uint64_t>(b) + 1;
+  boxes.half = static_cast<uint32_t>(n / 2);
+  boxes.reciprocal = static_cast<uint32_t>(((uint64_t{1} << 32) + n - 1) / n);
+  return boxes;
 }
 
-// Rounded division by n = 2b + 1 of a running sum, as a multiplication by a
-// 32-bit reciprocal.
-struct Divider {
-  uint32_t half;
-  uint32_t reciprocal;
-  explicit Divider(int b) {
-    const uint64_t n = 2 * static_cast<uint64_t>(b) + 1;
-    half = static_cast<uint32_t>(n / 2);
-    reciprocal = static_cast<uint32_t>(((uint64_t{1} << 32) + n - 1) / n);
-  }
-  uint32_t operator()(uint32_t sum) const {
-    return static_cast<uint32_t>((static_cast<uint64_t>(sum + half) * reciprocal) >> 32);
-  }
-};
+inline int clamp_index(int i, int n) { return i < 0 ? 0 : (i >= n ? n - 1 : i); }
 
-int clamp_index(int i, int n) { return i < 0 ? 0 : (i >= n ? n - 1 : i); }
+// The lanes of position p: P pixels from base + p * stride.
+template <int P>
+inline const uint8_t* pixel_lanes(const uint32_t* base, size_t stride, int p) {
+  return reinterpret_cast<const uint8_t*>(base + static_cast<size_t>(p) * stride);
+}
 
-// One box of radius b along `n` positions of `lanes` interleaved lanes:
-// out[p][l] = rounded mean of in[p - b .. p + b][l], edges repeated.
-void box(const uint16_t* in, uint16_t* out, int n, int lanes, int b, uint32_t* sums) {
-  const Divider div(b);
-  for (int l = 0; l < lanes; ++l) sums[l] = 0;
+// First box, from pixels: out[p] = sum of the lanes at positions p - b .. p + b.
+template <int P>
+void box_from_pixels(const uint32_t* base, size_t stride, int n, int b, uint32_t* out) {
+  constexpr int L = 4 * P;
+  uint32_t sum[L] = {};
   for (int q = -b; q <= b; ++q) {
-    const uint16_t* row = in + static_cast<size_t>(clamp_index(q, n)) * lanes;
-    for (int l = 0; l < lanes; ++l) sums[l] += row[l];
+    const uint8_t* v = pixel_lanes<P>(base, stride, clamp_index(q, n));
+    for (int l = 0; l < L; ++l) sum[l] += v[l];
   }
   for (int p = 0; p < n; ++p) {
-    uint16_t* o = out + static_cast<size_t>(p) * lanes;
-    for (int l = 0; l < lanes; ++l) o[l] = static_cast<uint16_t>(div(sums[l]));
-    const uint16_t* add = in + static_cast<size_t>(clamp_index(p + b + 1, n)) * lanes;
-    const uint16_t* sub = in + static_cast<size_t>(clamp_index(p - b, n)) * lanes;
-    for (int l = 0; l < lanes; ++l) sums[l] += add[l] - sub[l];
+    uint32_t* o = out + static_cast<size_t>(p) * L;
+    for (int l = 0; l < L; ++l) o[l] = sum[l];
+    const uint8_t* add = pixel_lanes<P>(base, stride, clamp_index(p + b + 1, n));
+    const uint8_t* sub = pixel_lanes<P>(base, stride, clamp_index(p - b, n));
+    for (int l = 0; l < L; ++l) sum[l] += static_cast<uint32_t>(add[l]) - sub[l];
   }
 }
 
-// The three boxes from a into a (b used as the other buffer); zero-radius
-// boxes are skipped.
-void three_boxes(uint16_t*& a, uint16_t*& b, int n, int lanes, const Boxes& boxes, uint32_t* sums) {
-  for (int k = 0; k < 3; ++k) {
-    if (boxes.b[k] == 0) continue;
-    box(a, b, n, lanes, boxes.b[k], sums);
-    uint16_t* t = a;
-    a = b;
-    b = t;
+// Second box, between line buffers.
+template <int P>
+void box_between(const uint32_t* in, int n, int b, uint32_t* out) {
+  constexpr int L = 4 * P;
+  uint32_t sum[L] = {};
+  for (int q = -b; q <= b; ++q) {
+    const uint32_t* v = in + static_cast<size_t>(clamp_index(q, n)) * L;
+    for (int l = 0; l < L; ++l) sum[l] += v[l];
+  }
+  for (int p = 0; p < n; ++p) {
+    uint32_t* o = out + static_cast<size_t>(p) * L;
+    for (int l = 0; l < L; ++l) o[l] = sum[l];
+    const uint32_t* add = in + static_cast<size_t>(clamp_index(p + b + 1, n)) * L;
+    const uint32_t* sub = in + static_cast<size_t>(clamp_index(p - b, n)) * L;
+    for (int l = 0; l < L; ++l) sum[l] += add[l] - sub[l];
   }
 }
 
-uint32_t to8(uint32_t v) {
-  v = (v + 128) >> 8;
-  return v > 255 ? 255 : v;
+// Third box into pixels: each R, G, B lane becomes round(sum / N); the
+// alpha byte comes from the line's source pixel.
+template <int P>
+void box_to_pixels(const uint32_t* in, int n, int b, const Boxes& boxes, const uint32_t* alpha, uint32_t* base,
+                   size_t stride) {
+  constexpr int L = 4 * P;
+  uint32_t sum[L] = {};
+  for (int q = -b; q <= b; ++q) {
+    const uint32_t* v = in + static_cast<size_t>(clamp_index(q, n)) * L;
+    for (int l = 0; l < L; ++l) sum[l] += v[l];
+  }
+  for (int p = 0; p < n; ++p) {
+    uint32_t* px = base + static_cast<size_t>(p) * stride;
+    const uint32_t* al = alpha + static_cast<size_t>(p) * stride;
+    uint32_t value[L];
+    for (int l = 0; l < L; ++l)
+      value[l] = static_cast<uint32_t>((static_cast<uint64_t>(sum[l] + boxes.half) * boxes.reciprocal) >> 32);
+    for (int k = 0; k < P; ++k)
+      px[k] = (al[k] & 0xFF000000u) | value[4 * k + 2] << 16 | value[4 * k + 1] << 8 | value[4 * k];
+    const uint32_t* add = in + static_cast<size_t>(clamp_index(p + b + 1, n)) * L;
+    const uint32_t* sub = in + static_cast<size_t>(clamp_index(p - b, n)) * L;
+    for (int l = 0; l < L; ++l) sum[l] += add[l] - sub[l];
+  }
 }
 
-// Working memory of one band: two line buffers and the running sums.
-struct Scratch {
-  uint16_t* a;
-  uint16_t* b;
-  uint32_t* sums;
-};
+// One line of n positions of P pixels (stride apart) from src into dst.
+template <int P>
+void blur_line(const uint32_t* src, uint32_t* dst, size_t stride, int n, const Boxes& boxes, uint32_t* a,
+               uint32_t* b) {
+  box_from_pixels<P>(src, stride, n, boxes.b[0], a);
+  box_between<P>(a, n, boxes.b[1], b);
+  box_to_pixels<P>(b, n, boxes.b[2], boxes, src, dst, stride);
+}
 
 struct Job {
   const uint32_t* src;
@@ -109,66 +142,38 @@ struct Job {
   size_t slot_bytes;
   std::atomic<int> next_slot{0};
 
-  Scratch take_slot() {
-    unsigned char* m = memory + slot_bytes * static_cast<size_t>(next_slot.fetch_add(1));
-    const auto line = static_cast<size_t>(line_elements());  // fits: the slot was allocated
-    auto* a = reinterpret_cast<uint16_t*>(m);
-    return {a, a + line, reinterpret_cast<uint32_t*>(a + 2 * line)};
+  // Two line buffers of one band.
+  uint32_t* take_slot() {
+    return reinterpret_cast<uint32_t*>(memory + slot_bytes * static_cast<size_t>(next_slot.fetch_add(1)));
   }
-  // Elements of one line buffer: a row of R, G, B or a stripe of all rows.
+  // Elements of one line buffer: a row of pixels or a stripe of all rows.
   uint64_t line_elements() const {
-    const uint64_t row = static_cast<uint64_t>(width) * 3;
-    const uint64_t stripe = static_cast<uint64_t>(height) * kLanes;
+    const uint64_t row = static_cast<uint64_t>(width) * 4;
+    const uint64_t stripe = static_cast<uint64_t>(height) * kMaxLanes;
     return row > stripe ? row : stripe;
   }
 };
 
 void horizontal(Job& job, int y0, int y1) {
-  Scratch s = job.take_slot();
-  const int w = job.width;
-  for (int y = y0; y < y1; ++y) {
-    const uint32_t* in = job.src + static_cast<size_t>(y) * w;
-    uint32_t* out = job.dst + static_cast<size_t>(y) * w;
-    uint16_t* a = s.a;
-    uint16_t* b = s.b;
-    for (int x = 0; x < w; ++x) {
-      a[3 * x] = static_cast<uint16_t>(((in[x] >> 16) & 255) << 8);
-      a[3 * x + 1] = static_cast<uint16_t>(((in[x] >> 8) & 255) << 8);
-      a[3 * x + 2] = static_cast<uint16_t>((in[x] & 255) << 8);
-    }
-    three_boxes(a, b, w, 3, job.boxes, s.sums);
-    for (int x = 0; x < w; ++x) {
-      out[x] = (in[x] & 0xFF000000u) | to8(a[3 * x]) << 16 | to8(a[3 * x + 1]) << 8 | to8(a[3 * x + 2]);
-    }
-  }
+  uint32_t* a = job.take_slot();
+  uint32_t* b = a + job.line_elements();
+  const size_t w = static_cast<size_t>(job.width);
+  for (int y = y0; y < y1; ++y) blur_line<1>(job.src + y * w, job.dst + y * w, 1, job.width, job.boxes, a, b);
 }
 
+// Stripes s0..s1 of kStripe columns; the band holding the last stripe also
+// does the columns past the whole stripes.
 void vertical(Job& job, int s0, int s1) {
-  Scratch s = job.take_slot();
-  const int w = job.width;
-  const int h = job.height;
-  for (int stripe = s0; stripe < s1; ++stripe) {
-    const int x0 = stripe * kStripe;
-    const int cols = w - x0 < kStripe ? w - x0 : kStripe;
-    const int lanes = cols * 3;
-    uint16_t* a = s.a;
-    uint16_t* b = s.b;
-    for (int y = 0; y < h; ++y) {
-      const uint32_t* px = job.dst + static_cast<size_t>(y) * w + x0;
-      uint16_t* line = a + static_cast<size_t>(y) * lanes;
-      for (int c = 0; c < cols; ++c) {
-        line[3 * c] = static_cast<uint16_t>(((px[c] >> 16) & 255) << 8);
-        line[3 * c + 1] = static_cast<uint16_t>(((px[c] >> 8) & 255) << 8);
-        line[3 * c + 2] = static_cast<uint16_t>((px[c] & 255) << 8);
-      }
-    }
-    three_boxes(a, b, h, lanes, job.boxes, s.sums);
-    for (int y = 0; y < h; ++y) {
-      uint32_t* px = job.dst + static_cast<size_t>(y) * w + x0;
-      const uint16_t* line = a + static_cast<size_t>(y) * lanes;
-      for (int c = 0; c < cols; ++c) {
-        px[c] = (px[c] & 0xFF000000u) | to8(line[3 * c]) << 16 | to8(line[3 * c + 1]) << 8 | to8(line[3 * c + 2]);
-      }
+  uint32_t* a = job.take_slot();
+  uint32_t* b = a + job.line_elements();
+  const size_t w = static_cast<size_t>(job.width);
+  const int whole = job.width / kStripe;
+  for (int s = s0; s < s1; ++s) {
+    if (s < whole) {
+      uint32_t* col = job.dst + static_cast<size_t>(s) * kStripe;
+      blur_line<kStripe>(col, col, w, job.height, job.boxes, a, b);
+    } else {
+      for (int x = whole * kStripe; x < job.width; ++x) blur_line<1>(job.dst + x, job.dst + x, w, job.height, job.boxes, a, b);
     }
   }
 }
@@ -201,13 +206,13 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
     return IEL_OK;
   }
   Job job{src, dst, w, h, boxes_of(radius), nullptr, 0};
+  // Whole stripes, plus one for the columns left over.
   const int stripes = (w + kStripe - 1) / kStripe;
   const int row_bands = px_band_count(h, kMinRowsPerBand);
   const int stripe_bands = px_band_count(stripes, kMinStripesPerBand);
   const int slots = row_bands + stripe_bands;
-  const uint64_t line = job.line_elements();
   // Sizes are worked out in 64 bits: one allocation holds at most 2^31 - 1 bytes.
-  const uint64_t slot = (2 * line * sizeof(uint16_t) + kLanes * sizeof(uint32_t) + 15) & ~15ull;
+  const uint64_t slot = (2 * job.line_elements() * sizeof(uint32_t) + 15) & ~15ull;
   const uint64_t total = slot * static_cast<uint64_t>(slots);
   job.slot_bytes = static_cast<size_t>(slot);
   job.memory = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
