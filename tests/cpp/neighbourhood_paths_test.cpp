@@ -100,3 +100,53 @@ TEST(NeighbourhoodPaths, SketchOnTextureMatchesThePlainPath) {
     ASSERT_EQ(r.fast, r.plain) << s.w << "x" << s.h;
   }
 }
+
+TEST(NeighbourhoodPaths, HalftoneTablesMatchTheDoubleConversions) {
+  unsigned seed = 11;
+  for (const Size& s : kSizes) {
+    Bytes in = random_bytes(static_cast<size_t>(s.w) * s.h * 3, seed++);
+    // Pure black, pure white and single-channel pixels first: the special
+    // cases of the separation.
+    const unsigned char specials[5][3] = {{0, 0, 0}, {255, 255, 255}, {0, 0, 1}, {1, 0, 0}, {255, 0, 0}};
+    for (size_t i = 0; i < 5 && 3 * i + 2 < in.size(); ++i)
+      for (int c = 0; c < 3; ++c) in[3 * i + c] = specials[i][c];
+    for (const Bytes& pic : {in, smooth_rgb(s.w, s.h, seed++)}) {
+      const Both r = both_paths([&] { return run_rgb(pic, s.w, s.h, IEL_Halftone_Colored_CMYK); });
+      ASSERT_EQ(r.fast, r.plain) << s.w << "x" << s.h;
+      // In place, the plain path's blend sees its own result.
+      const Both inplace = both_paths([&] {
+        Bytes b = pic;
+        structIELImage a{s.w, s.h, IEL_FORMAT_RGB888, b.data()};
+        EXPECT_EQ(IEL_Halftone_Colored_CMYK(&a, &a), IEL_OK);
+        return b;
+      });
+      ASSERT_EQ(inplace.fast, inplace.plain) << s.w << "x" << s.h;
+    }
+  }
+  // Colours across the whole cube through the tables: every 5th value of
+  // each channel (52^3 pixels, 376 x 374 with black after them).
+  const int w = 376, h = 374;
+  Bytes cube(static_cast<size_t>(w) * h * 3, 0);
+  size_t i = 0;
+  for (int r = 0; r < 256; r += 5)
+    for (int g = 0; g < 256; g += 5)
+      for (int b = 0; b < 256; b += 5, i += 3) {
+        cube[i] = static_cast<unsigned char>(r);
+        cube[i + 1] = static_cast<unsigned char>(g);
+        cube[i + 2] = static_cast<unsigned char>(b);
+      }
+  const Both r = both_paths([&] { return run_rgb(cube, w, h, IEL_Halftone_Colored_CMYK); });
+  EXPECT_EQ(r.fast, r.plain);
+}
+
+TEST(NeighbourhoodPaths, OilPaintLevelPlaneMatchesThePlainModeFilter) {
+  unsigned seed = 21;
+  for (const Size& s : kSizes) {
+    for (const Bytes& in : {random_bytes(static_cast<size_t>(s.w) * s.h * 3, seed++), smooth_rgb(s.w, s.h, seed++)}) {
+      const Both r = both_paths([&] { return run_rgb(in, s.w, s.h, IEL_OilPaintEdge); });
+      ASSERT_EQ(r.fast, r.plain) << s.w << "x" << s.h;
+      const Both m = both_paths([&] { return run_rgb(in, s.w, s.h, IEL_OilifyFix); });
+      ASSERT_EQ(m.fast, m.plain) << s.w << "x" << s.h;
+    }
+  }
+}

@@ -167,10 +167,58 @@ int IEL_GaussianBlur(structIELImage* input, structIELImage* output) {
   return IEL_OK;
 }
 
+namespace {
+// The mode filter of packed RGB with each pixel's 16-level luminance taken
+// once into a plane: the same 3 x 3 window, visited in the same order (left,
+// middle, right column, each top to bottom), picks the same pixel. False
+// when the plane could not be allocated (the plain path then runs).
+bool oilify_rgb_levels(const unsigned char* src, unsigned char* dst, int w, int h) {
+  const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
+  auto* level = n <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n))) : nullptr;
+  if (!level) return false;
+  const size_t row = static_cast<size_t>(w);
+  px_for_rows(h, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* p = src + 3 * i;
+      level[i] = static_cast<unsigned char>(IEL_LumaSum(p[0], p[1], p[2]) >> 14);
+    }
+  });
+  px_for_rows(h, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const size_t ys[3] = {(y > 0 ? y - 1 : 0) * row, y * row, (y < h - 1 ? y + 1 : h - 1) * row};
+      unsigned char* o = dst + y * row * 3;
+      for (int x = 0; x < w; ++x) {
+        const int xs[3] = {x > 0 ? x - 1 : 0, x, x < w - 1 ? x + 1 : w - 1};
+        unsigned char hist[16] = {};
+        int best = 0;
+        size_t pick = 0;
+        for (int cx : xs) {
+          for (size_t cy : ys) {
+            const size_t at = cy + cx;
+            if (++hist[level[at]] > best) {
+              best = hist[level[at]];
+              pick = at;
+            }
+          }
+        }
+        std::memcpy(o + 3 * x, src + 3 * pick, 3);
+      }
+    }
+  });
+  IF_FREE(level);
+  return true;
+}
+}  // namespace
+
 int IEL_OilifyFix(structIELImage* input, structIELImage* output) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, packed_pixels)) return rc;
   const int w = input->width, h = input->height;
   const int bpp = IEL_BytesPerPixel(input->format);
+  // (An output that is the input itself needs the plain path's order.)
+  if (bpp == 3 && !px_scalar_only() && input->buffer != output->buffer &&
+      oilify_rgb_levels(input->buffer, output->buffer, w, h)) {
+    return IEL_OK;
+  }
   const unsigned char* src = input->buffer;
   unsigned char* dst = output->buffer;
   px_for_rows(h, [&](int y0, int y1) {
@@ -215,17 +263,20 @@ int IEL_OilPaintEdge(structIELImage* input, structIELImage* output) {
     return rc;
   }
   const unsigned char* src = input->buffer;
-  for (size_t i = 0; i < n; ++i) {
-    const unsigned char* p = src + 3 * i;
-    unsigned char* q = work + 3 * i;
-    const int d = q[0] - p[0];
-    // Only a blurred red at least two above the pixel's own darkens it.
-    if (d > 0 && d != 1) {
-      for (int c = 0; c < 3; ++c) q[c] = static_cast<unsigned char>(p[c] * p[c] / 255);
-    } else {
-      std::memcpy(q, p, 3);
+  const size_t row = static_cast<size_t>(input->width);
+  px_for_rows(input->height, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* p = src + 3 * i;
+      unsigned char* q = work + 3 * i;
+      const int d = q[0] - p[0];
+      // Only a blurred red at least two above the pixel's own darkens it.
+      if (d > 0 && d != 1) {
+        for (int c = 0; c < 3; ++c) q[c] = static_cast<unsigned char>(p[c] * p[c] / 255);
+      } else {
+        std::memcpy(q, p, 3);
+      }
     }
-  }
+  });
   int rc = IEL_OilifyFix(&blurred, output);
   IF_FREE(work);
   return rc;
