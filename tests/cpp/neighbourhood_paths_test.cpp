@@ -12,6 +12,7 @@
 #include "effect/kalo/iel/iel.h"
 #include "effect/kalo/iel/iel_artistic.h"
 #include "effect/kalo/px_parallel.h"
+#include "effect/px_gpu_effects/px_gpu_effects.h"
 
 namespace {
 using Bytes = std::vector<unsigned char>;
@@ -148,5 +149,58 @@ TEST(NeighbourhoodPaths, OilPaintLevelPlaneMatchesThePlainModeFilter) {
       const Both m = both_paths([&] { return run_rgb(in, s.w, s.h, IEL_OilifyFix); });
       ASSERT_EQ(m.fast, m.plain) << s.w << "x" << s.h;
     }
+  }
+}
+
+namespace {
+std::vector<int> random_argb(size_t n, unsigned seed) {
+  std::mt19937 gen(seed);
+  std::vector<int> v(n);
+  for (int& p : v) p = static_cast<int>(gen());
+  return v;
+}
+Bytes as_bytes(const std::vector<int>& v) {
+  const auto* b = reinterpret_cast<const unsigned char*>(v.data());
+  return Bytes(b, b + v.size() * 4);
+}
+}  // namespace
+
+TEST(NeighbourhoodPaths, ShaderLooksReadByTablesAsThePlainPathDivides) {
+  unsigned seed = 31;
+  for (const Size& s : kSizes) {
+    const size_t n = static_cast<size_t>(s.w) * s.h;
+    std::vector<int> in = random_argb(n, seed++), t1 = random_argb(n, seed++), t2 = random_argb(n, seed++),
+                     t3 = random_argb(n, seed++);
+    // Grey strokes give diagonal dabs; every byte value shows up in the
+    // stroke texture's red and blue on the larger sizes.
+    for (size_t i = 0; i < n; i += 3) t1[i] = static_cast<int>(0xFF000000u | (i & 255) * 0x010101u);
+    auto look = [&](int which) {
+      return both_paths([&] {
+        std::vector<int> out(n, 0x5A5A5A5A);
+        const std::vector<int> before = in;
+        switch (which) {
+          case 0: gpu_oilPastel(in.data(), out.data(), t1.data(), s.w, s.h); break;
+          case 1: gpu_impressionist(in.data(), out.data(), t1.data(), t2.data(), s.w, s.h); break;
+          default: gpu_stucchevole(in.data(), out.data(), t1.data(), t2.data(), t3.data(), s.w, s.h); break;
+        }
+        EXPECT_EQ(in, before);
+        return as_bytes(out);
+      });
+    };
+    for (int which = 0; which < 3; ++which) {
+      const Both r = look(which);
+      ASSERT_EQ(r.fast, r.plain) << "look " << which << " " << s.w << "x" << s.h;
+      ASSERT_NE(r.fast, as_bytes(std::vector<int>(n, 0x5A5A5A5A)));
+    }
+    // The partial forms run the whole ones: a selected ellipse of the mask.
+    std::vector<unsigned char> mask(n, 0);
+    for (size_t i = 0; i < n; i += 2) mask[i] = 1;
+    const Both part = both_paths([&] {
+      std::vector<int> out(n, 7);
+      gpu_impressionist_partial(in.data(), mask.data(), out.data(), t1.data(), t2.data(), s.w, s.h, 0, s.w - 1, 0,
+                                s.h - 1);
+      return as_bytes(out);
+    });
+    ASSERT_EQ(part.fast, part.plain);
   }
 }
