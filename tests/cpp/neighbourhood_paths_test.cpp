@@ -9,6 +9,7 @@
 #include <random>
 #include <vector>
 
+#include "effect/blur/px_blur.h"
 #include "effect/kalo/iel/iel.h"
 #include "effect/kalo/iel/iel_artistic.h"
 #include "effect/kalo/px_parallel.h"
@@ -202,5 +203,54 @@ TEST(NeighbourhoodPaths, ShaderLooksReadByTablesAsThePlainPathDivides) {
       return as_bytes(out);
     });
     ASSERT_EQ(part.fast, part.plain);
+  }
+}
+
+TEST(NeighbourhoodPaths, BlurCompositingByBlendedRowsMatchesThePlainBilinear) {
+  // Sizes that reduce by 0 to 4 (up to 3300 a side), thin strips (their own
+  // steps, no 11-bit index), one pixel.
+  const Size sizes[] = {{1, 1}, {3, 700}, {700, 3}, {37, 29}, {431, 97}, {867, 5}, {1700, 9}, {3300, 4}, {9, 3300}};
+  unsigned seed = 41;
+  for (const Size& s : sizes) {
+    const size_t n = static_cast<size_t>(s.w) * s.h;
+    const std::vector<int> in = random_argb(n, seed++);
+    // A selection of irregular blobs: the reduced mask mixes selected and
+    // unselected neighbours.
+    std::vector<unsigned char> mask(n, 0);
+    std::mt19937 gen(seed++);
+    for (size_t i = 0; i < n; ++i) mask[i] = ((i / 7 + gen() % 3) % 5) < 3 ? 1 : static_cast<unsigned char>(gen() % 3);
+    for (int level : {0, 3, 7}) {
+      const Both whole = both_paths([&] {
+        std::vector<int> out(n, 1);
+        EXPECT_EQ(px_make_blur(in.data(), nullptr, out.data(), s.w, s.h, level, 0, -1, 0, -1), 40960);
+        return as_bytes(out);
+      });
+      ASSERT_EQ(whole.fast, whole.plain) << s.w << "x" << s.h << " level " << level;
+      const Both selected = both_paths([&] {
+        std::vector<int> out(n, 1);
+        std::vector<unsigned char> m = mask;
+        EXPECT_EQ(px_make_blur(in.data(), m.data(), out.data(), s.w, s.h, level, 0, s.w - 1, 0, s.h - 1), 40960);
+        return as_bytes(out);
+      });
+      ASSERT_EQ(selected.fast, selected.plain) << s.w << "x" << s.h << " level " << level;
+      const Both preview = both_paths([&] {
+        std::vector<unsigned char> m = mask;
+        EXPECT_EQ(px_Init_blur(in.data(), m.data(), s.w, s.h, 0, s.w - 1, 0, s.h - 1), 40960);
+        std::vector<int> out(n, 1);
+        px_make_blur_preview(in.data(), m.data(), out.data(), s.w, s.h, level);
+        px_destroy_blur();
+        return as_bytes(out);
+      });
+      ASSERT_EQ(preview.fast, preview.plain) << s.w << "x" << s.h << " level " << level;
+    }
+    // Tilt-shift: bands in the middle, at the top edge, wider than the picture.
+    for (auto [centre, band] : {std::pair{s.h / 2, s.h / 8}, {0, 1}, {s.h - 1, s.h * 2}}) {
+      const Both tilt = both_paths([&] {
+        std::vector<int> out(n, 1);
+        EXPECT_EQ(px_apply_tiltshift(in.data(), out.data(), s.w, s.h, centre, band), 40960);
+        return as_bytes(out);
+      });
+      ASSERT_EQ(tilt.fast, tilt.plain) << s.w << "x" << s.h << " centre " << centre;
+    }
   }
 }

@@ -7,6 +7,7 @@
 
 #include "../blur/px_blur.h"
 #include "../kalo/px_mem.h"
+#include "../kalo/px_parallel.h"
 #include "../px_color/px_brush.h"
 #include "../px_types.h"
 #include "../face/fd_detector.h"
@@ -372,21 +373,30 @@ void px_outfocus_weight_map(unsigned char* map, int width, int height, const caF
 }
 
 void px_outfocus_compose(const int* sharp, const int* blurred, const unsigned char* map, int* dst, int n) {
-  for (int i = 0; i < n; ++i) {
-    const int m = map[i];
-    if (m == 255) {
-      dst[i] = blurred[i];
-      continue;
-    }
-    const unsigned b = static_cast<unsigned>(blurred[i]), s = static_cast<unsigned>(sharp[i]);
-    unsigned out = 0xFF000000u;  // mixed pixels are opaque
-    for (int shift = 0; shift <= 16; shift += 8) {
-      unsigned v = (m * ((b >> shift) & 0xFF) + (255 - m) * ((s >> shift) & 0xFF)) >> 8;
-      if (v > 255) v = 255;
-      out |= v << shift;
-    }
-    dst[i] = static_cast<int>(out);
-  }
+  // Runs of 16384 pixels on the row-band workers; every pixel stands alone
+  // (dst may be blurred or sharp itself).
+  constexpr int kRun = 1 << 14;
+  px_for_rows(
+      (n + kRun - 1) / kRun,
+      [&](int r0, int r1) {
+        const int end = static_cast<int64_t>(r1) * kRun < n ? r1 * kRun : n;
+        for (int i = r0 * kRun; i < end; ++i) {
+          const int m = map[i];
+          if (m == 255) {
+            dst[i] = blurred[i];
+            continue;
+          }
+          const unsigned b = static_cast<unsigned>(blurred[i]), s = static_cast<unsigned>(sharp[i]);
+          unsigned out = 0xFF000000u;  // mixed pixels are opaque
+          for (int shift = 0; shift <= 16; shift += 8) {
+            unsigned v = (m * ((b >> shift) & 0xFF) + (255 - m) * ((s >> shift) & 0xFF)) >> 8;
+            if (v > 255) v = 255;
+            out |= v << shift;
+          }
+          dst[i] = static_cast<int>(out);
+        }
+      },
+      4);
 }
 
 int px_control_outfocusing_in_portrait(const int* src, int* dst, int width, int height, int strength) {
