@@ -13,6 +13,7 @@
 #include "effect/kalo/iel/iel.h"
 #include "effect/kalo/iel/iel_artistic.h"
 #include "effect/kalo/px_parallel.h"
+#include "effect/px_filter/px_filter.h"
 #include "effect/px_gpu_effects/px_gpu_effects.h"
 
 namespace {
@@ -252,5 +253,43 @@ TEST(NeighbourhoodPaths, BlurCompositingByBlendedRowsMatchesThePlainBilinear) {
       });
       ASSERT_EQ(tilt.fast, tilt.plain) << s.w << "x" << s.h << " centre " << centre;
     }
+  }
+}
+
+TEST(NeighbourhoodPaths, SoftGlowAndSharpenMatchThePlainPath) {
+  // Heights and widths around 32 and 64 change the glow radius (side / 32).
+  const Size sizes[] = {{1, 1}, {1, 90}, {90, 1}, {31, 33}, {64, 65}, {127, 300}, {301, 95}, {333, 520}};
+  unsigned seed = 51;
+  for (const Size& s : sizes) {
+    const size_t n = static_cast<size_t>(s.w) * s.h;
+    const std::vector<int> in = random_argb(n, seed++);
+    const Both glow = both_paths([&] {
+      std::vector<int> src = in, out(n, 3);
+      px_softglow(src.data(), out.data(), s.w, s.h);
+      EXPECT_EQ(src, in);
+      return as_bytes(out);
+    });
+    ASSERT_EQ(glow.fast, glow.plain) << s.w << "x" << s.h;
+    const Both glow_in_place = both_paths([&] {
+      std::vector<int> pic = in;
+      px_softglow(pic.data(), pic.data(), s.w, s.h);
+      return as_bytes(pic);
+    });
+    ASSERT_EQ(glow_in_place.fast, glow.plain) << s.w << "x" << s.h;
+    ASSERT_EQ(glow_in_place.plain, glow.plain);
+    std::vector<unsigned char> mask(n);
+    for (size_t i = 0; i < n; ++i) mask[i] = static_cast<unsigned char>(i % 3);
+    const Both sharp = both_paths([&] {
+      std::vector<int> out(n, 3), pic = in;
+      px_apply_sharpen_all(pic.data(), out.data(), s.w, s.h);
+      std::vector<int> part(n, 4), inplace = in;
+      std::vector<unsigned char> m = mask;
+      px_apply_sharpen(pic.data(), m.data(), part.data(), s.w, s.h, 0, s.w - 1, 0, s.h - 1);
+      px_apply_sharpen_all(inplace.data(), inplace.data(), s.w, s.h);
+      out.insert(out.end(), part.begin(), part.end());
+      out.insert(out.end(), inplace.begin(), inplace.end());
+      return as_bytes(out);
+    });
+    ASSERT_EQ(sharp.fast, sharp.plain) << s.w << "x" << s.h;
   }
 }
