@@ -17,6 +17,8 @@
 #endif
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 using Picture = BenchPicture;
 
 // The left half of the picture is selected.

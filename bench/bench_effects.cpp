@@ -3,6 +3,8 @@
 // single-threaded path.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstring>
 #include <random>
 #include <vector>
@@ -11,6 +13,8 @@
 #include "effect/kalo/iel/iel_artistic.h"
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 struct Picture {
   int width, height;
   std::vector<unsigned char> rgb, rgb_out;
@@ -60,13 +64,6 @@ void run(benchmark::State& state, int16_t effect, int32_t level, bool argb) {
   state.SetItemsProcessed(state.iterations() * static_cast<int64_t>(p.width) * p.height);
 }
 
-void BM_Memcpy(benchmark::State& state) {
-  Picture& p = picture(static_cast<int>(state.range(0)));
-  for (auto _ : state) {
-    std::memcpy(p.rgb_out.data(), p.rgb.data(), p.rgb.size());
-    benchmark::ClobberMemory();
-  }
-}
 
 void BM_Sketch(benchmark::State& state) {
   Picture& p = picture(static_cast<int>(state.range(0)));
@@ -76,12 +73,12 @@ void BM_Sketch(benchmark::State& state) {
 }
 }  // namespace
 
-BENCHMARK(BM_Memcpy)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Sketch)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, cartoon, IEL_EFFECT_CARTOON, 2, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, magic_pen, IEL_EFFECT_MAGIC_PEN, 0, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, oil_paint, IEL_EFFECT_OIL_PAINT, 0, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, posterize, IEL_EFFECT_POSTERIZE, 0, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(run, sepia, IEL_EFFECT_SEPIA, 15, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, sketch_texture, IEL_EFFECT_SKETCH_TEXTURE, 0, false)
     ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(run, halftone, IEL_EFFECT_HALFTONE, 0, false)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond);

@@ -2,6 +2,8 @@
 // of 1 %, 3 % and 10 % of the area.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cmath>
 #include <cstdint>
 #include <vector>
@@ -9,6 +11,8 @@
 #include "effect/object/px_eraser.h"
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 void BM_Eraser(benchmark::State& state) {
   const int w = 1200, h = 840;
   const double share = state.range(0) / 100.0;

@@ -4,6 +4,8 @@
 // sample of the tests, enlarged to 640 x 640.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstdio>
 #include <string>
 #include <vector>
@@ -18,6 +20,8 @@
 #endif
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 struct Photo {
   int width = 0, height = 0;
   std::vector<unsigned char> grey;

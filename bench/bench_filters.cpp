@@ -2,6 +2,8 @@
 // effects. A chain of N whole-picture adjustments should cost about N passes.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstdint>
 #include <random>
 #include <vector>
@@ -11,6 +13,8 @@
 #include "effect/px_gpu_effects/px_gpu_effects.h"
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 struct Pictures {
   int w, h;
   std::vector<int> in, out, tex, tex2, tex3;

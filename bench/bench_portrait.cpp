@@ -3,6 +3,8 @@
 // quarter of the photo's side.
 #include <benchmark/benchmark.h>
 
+#include "bench_picture.h"
+
 #include <cstdio>
 #include <cstring>
 #include <string>
@@ -12,6 +14,8 @@
 #include "effect/portrait/px_portrait.h"
 
 namespace {
+GLIMMER_BENCH_MEMCPY();
+
 struct Photo {
   int width = 0, height = 0;
   std::vector<int> in, out, preview;

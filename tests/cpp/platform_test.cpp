@@ -92,3 +92,27 @@ TEST(Platform, BandsCoverEveryRowOnce) {
   EXPECT_EQ(px_band_count(10000, 1), 1);
   px_set_scalar_only(was);
 }
+
+TEST(Platform, ThreadCapLimitsBands) {
+  const bool was = px_scalar_only();
+  px_set_scalar_only(false);
+  px_set_thread_count(0);
+  const int all = px_thread_count();
+  EXPECT_GE(all, 1);
+  EXPECT_LE(all, 8);
+  EXPECT_EQ(px_band_count(10000, 1), all);
+  px_set_thread_count(1);
+  EXPECT_EQ(px_thread_count(), 1);
+  EXPECT_EQ(px_band_count(10000, 1), 1);
+  px_set_thread_count(2);
+  EXPECT_EQ(px_band_count(10000, 1), all < 2 ? all : 2);
+  // A cap still splits the rows exactly once each.
+  std::vector<int> hits(999, 0);
+  px_for_rows(999, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) hits[y]++;
+  }, 1);
+  for (int h : hits) ASSERT_EQ(h, 1);
+  px_set_thread_count(0);
+  EXPECT_EQ(px_thread_count(), all);
+  px_set_scalar_only(was);
+}

@@ -17,8 +17,18 @@ bool scalar_from_env() {
 
 std::atomic<bool> g_scalar{scalar_from_env()};
 
+// GLIMMER_THREADS=n at load time caps the bands at n (0 or unset: one per core).
+int threads_from_env() {
+  const char* v = std::getenv("GLIMMER_THREADS");
+  return v ? std::atoi(v) : 0;
+}
+
+std::atomic<int> g_threads{threads_from_env()};
+
 int cpu_count() {
   long n = sysconf(_SC_NPROCESSORS_ONLN);
+  const int cap = g_threads.load(std::memory_order_relaxed);
+  if (cap > 0 && cap < n) n = cap;
   if (n < 1) return 1;
   return n > kMaxBands ? kMaxBands : static_cast<int>(n);
 }
@@ -38,6 +48,8 @@ void* run_band(void* arg) {
 
 bool px_scalar_only() { return g_scalar.load(std::memory_order_relaxed); }
 void px_set_scalar_only(bool on) { g_scalar.store(on); }
+void px_set_thread_count(int threads) { g_threads.store(threads < 0 ? 0 : threads); }
+int px_thread_count() { return cpu_count(); }
 
 int px_band_count(int rows, int min_rows_per_band) {
   if (px_scalar_only() || rows <= 0) return 1;
