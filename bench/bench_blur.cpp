@@ -37,12 +37,6 @@ void run(benchmark::State& state, Op op) {
   bench_run(state, op);
 }
 
-// The floor: memcpy of the same picture.
-void Memcpy(benchmark::State& s) {
-  bench_run(s, [](Picture& p) { std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4); });
-}
-BENCHMARK(Memcpy)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
-
 void ApplyBlur(benchmark::State& s) {
   run(s, [](Picture& p) {
     px_make_blur(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 7, 0, p.width - 1, 0, p.height - 1);

@@ -117,12 +117,6 @@ void OutfocusPreview(benchmark::State& s) {
   });
 }
 
-// The floor: memcpy of the 12 MP picture.
-void Memcpy(benchmark::State& s) {
-  bench_run(s, [](BenchPicture& p) { std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4); });
-}
-BENCHMARK(Memcpy)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
-
 #define PORTRAIT_BENCH(name) BENCHMARK(name)->Arg(3)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 PORTRAIT_BENCH(Analyse)
 PORTRAIT_BENCH(AnalyseUpright)
