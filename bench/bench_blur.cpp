@@ -79,7 +79,7 @@ void VariableBlur(benchmark::State& s) {
   });
 }
 BENCHMARK(VariableBlur)
-    ->ArgsProduct({{1, 12}, {3, 15, 63}})
+    ->ArgsProduct({{1, 12}, {3, 7, 15, 63}})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime();
 
@@ -93,7 +93,7 @@ void OpenCvGaussianBlur(benchmark::State& s) {
   });
 }
 BENCHMARK(OpenCvGaussianBlur)
-    ->ArgsProduct({{1, 12}, {3, 15, 63}})
+    ->ArgsProduct({{1, 12}, {3, 7, 15, 63}})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime();
 #endif

@@ -1,30 +1,36 @@
 // Effect 38, the variable blur: a smooth, Gaussian-looking blur of a given
-// radius on ARGB pixels whose cost does not grow with the radius.
+// radius r on ARGB pixels (sigma about r / 3, reaching about r pixels)
+// whose cost hardly grows with the radius.
 //
-// Design: three box filters one after the other in each direction. Their
-// radii b1 >= b2 >= b3 add up to the requested radius r (b1 = (r + 2) / 3,
-// b2 = (r + 1) / 3, b3 = r / 3), so the combined kernel reaches exactly r
-// pixels on each side and, being the convolution of three boxes, is close to
-// a Gaussian of sigma about r / 3. Each box is a running sum (one add and one
-// subtract per value whatever its size); every box repeats the border values
-// of its own input beyond the edge. The sums are not divided between the
-// boxes: the third box's sum is the exact weighted sum of the 8-bit input,
-// divided once by N = (2 b1 + 1)(2 b2 + 1)(2 b3 + 1) and rounded (a
-// multiplication by the 32-bit reciprocal rounded up, which gives every
-// constant picture back exactly). So each direction rounds once, and the
-// horizontal result is stored as 8-bit values before the vertical direction.
-// Sums stay below 2^31 because N is kept at most 2^23: radii above
-// kMaxRadius blur as kMaxRadius.
+// Design. The blur proper has a small radius q: the binomial kernel of 2q + 1
+// taps C(2q, j) / 4^q (sigma sqrt(q / 2)), applied as one weighted sum of
+// bytes per direction and rounded once per direction; the horizontal result
+// is kept as 8-bit values for the vertical direction. Borders repeat the
+// edge pixel.
 //
-// Lanes: a pixel's four bytes are four lanes (the alpha lane is summed too
-// and thrown away: the result keeps the input's alpha), so a box step is one
-// add and one subtract on a pixel's worth of lanes. The horizontal direction
-// runs along each row (rows on worker threads); the vertical direction runs
-// down stripes of kStripe columns, 4 * kStripe lanes side by side (stripes
-// on worker threads; the last columns that do not fill a stripe run one by
-// one). Every row or stripe is computed the same way whichever thread takes
-// it, so the result does not depend on the number of threads (nor on
-// GLIMMER_SCALAR). The output may be the input itself.
+// Radii up to kDirectRadius (4) blur at full size with q = r. Larger radii
+// blur a reduced picture: blocks of k x k pixels, k = max(2, round(2r / 9)),
+// become their rounded means (the blocks of the last column and row may be
+// smaller), the reduced picture is blurred with q = 3, and every output pixel
+// is interpolated bilinearly from the blurred blocks around its centre
+// (pixel x lies at block coordinate (x + 0.5) / k - 0.5, clamped at the
+// borders; the weights are that position in 256ths, across first, each
+// direction rounded). The three steps add up to a sigma of about 1.3 k,
+// about r / 3 as at full size, and an impulse spreads at most r + 2 pixels
+// (k (q + 1) + (k - 1) / 2 of them); a constant picture stays constant. So
+// above the direct radii the cost is one reduction and one interpolation of
+// the picture whatever the radius.
+//
+// Lanes: a pixel's four bytes are four lanes worked alike (alpha too: the
+// result keeps the input's alpha), eight 16-bit lanes at a time (every sum
+// fits 16 bits). Rows go to the row-band workers: a band of the blur makes
+// the horizontal rows it needs (the q rows around it too) in a ring of
+// 2q + 1 rows and writes its own output rows; reduction and interpolation
+// write their own rows. Every row is computed the same way whichever band
+// takes it, so the result does not depend on the number of threads (nor on
+// GLIMMER_SCALAR). The output may be the input itself (the full-size blur
+// then works from a copy of it). Radii above kMaxRadius blur as kMaxRadius.
+#include <array>
 #include <atomic>
 #include <cstdint>
 #include <cstring>
@@ -35,151 +41,262 @@
 #include "iel_internal.h"
 
 namespace {
-constexpr int kStripe = 8;              // columns of one vertical stripe
-constexpr int kMaxLanes = 4 * kStripe;  // lanes of one position
-constexpr int kMaxRadius = 300;         // (2 * 100 + 1)^3 < 2^23
+constexpr int kMaxRadius = 300;
+constexpr int kDirectRadius = 4;   // larger radii blur a reduced picture
+constexpr int kReducedRadius = 3;  // the blur of the reduced picture
+constexpr int kMinRowsPerBand = 16;
 
-struct Boxes {
-  int b[3];
-  uint32_t half;        // N / 2
-  uint32_t reciprocal;  // ceil(2^32 / N)
-};
+// Eight byte lanes widened to 16 bits (GCC/Clang vector extensions: SSE2
+// on the host, NEON on ARM, plain code elsewhere).
+typedef uint8_t u8x8 __attribute__((vector_size(8)));
+typedef uint16_t u16x8 __attribute__((vector_size(16)));
+typedef uint32_t u32x4 __attribute__((vector_size(16)));
 
-Boxes boxes_of(int radius) {
-  if (radius > kMaxRadius) radius = kMaxRadius;
-  Boxes boxes{{(radius + 2) / 3, (radius + 1) / 3, radius / 3}, 0, 0};
-  uint64_t n = 1;
-  for (int b : boxes.b) n *= 2 * static_cast<uint64_t>(b) + 1;
-  boxes.half = static_cast<uint32_t>(n / 2);
-  boxes.reciprocal = static_cast<uint32_t>(((uint64_t{1} << 32) + n - 1) / n);
-  return boxes;
+inline u16x8 load8(const uint8_t* p) {
+  u8x8 v;
+  std::memcpy(&v, p, 8);
+  return __builtin_convertvector(v, u16x8);
+}
+inline void store8(uint8_t* p, u16x8 v) {
+  const u8x8 b = __builtin_convertvector(v, u8x8);
+  std::memcpy(p, &b, 8);
+}
+
+// The binomial kernel of radius Q: C(2Q, j) for j = 0..2Q, summing to 4^Q
+// (at most 256: Q <= 4).
+template <int Q>
+constexpr std::array<uint16_t, 2 * Q + 1> binomial() {
+  std::array<uint16_t, 2 * Q + 1> w{};
+  w[0] = 1;
+  for (int n = 1; n <= 2 * Q; ++n) {
+    for (int j = n; j > 0; --j) w[j] = static_cast<uint16_t>(w[j] + w[j - 1]);
+  }
+  return w;
 }
 
 inline int clamp_index(int i, int n) { return i < 0 ? 0 : (i >= n ? n - 1 : i); }
 
-// The lanes of position p: P pixels from base + p * stride.
-template <int P>
-inline const uint8_t* pixel_lanes(const uint32_t* base, size_t stride, int p) {
-  return reinterpret_cast<const uint8_t*>(base + static_cast<size_t>(p) * stride);
+// One row of n pixels (4n bytes) blurred along itself into out.
+template <int Q>
+void blur_row(const uint8_t* in, uint8_t* out, int n) {
+  static constexpr std::array<uint16_t, 2 * Q + 1> W = binomial<Q>();
+  constexpr int shift = 2 * Q;
+  constexpr uint16_t half = 1u << (shift - 1);
+  auto edge = [&](int x) {
+    for (int c = 0; c < 4; ++c) {
+      unsigned s = half;
+      for (int j = 0; j < 2 * Q + 1; ++j) s += W[j] * in[4 * clamp_index(x + j - Q, n) + c];
+      out[4 * x + c] = static_cast<uint8_t>(s >> shift);
+    }
+  };
+  const int inner0 = Q < n ? Q : n, inner1 = n - Q > inner0 ? n - Q : inner0;
+  for (int x = 0; x < inner0; ++x) edge(x);
+  // Inner pixels, eight lanes (two pixels) at a time; the last odd pixel by itself.
+  int x = inner0;
+  for (; x + 2 <= inner1; x += 2) {
+    const uint8_t* p = in + 4 * x;
+    u16x8 s = u16x8{} + half + W[Q] * load8(p);
+    for (int j = 0; j < Q; ++j) s += W[j] * (load8(p + 4 * (j - Q)) + load8(p + 4 * (Q - j)));
+    store8(out + 4 * x, s >> shift);
+  }
+  for (; x < n; ++x) edge(x);
 }
 
-// First box, from pixels: out[p] = sum of the lanes at positions p - b .. p + b.
-template <int P>
-void box_from_pixels(const uint32_t* base, size_t stride, int n, int b, uint32_t* out) {
-  constexpr int L = 4 * P;
-  uint32_t sum[L] = {};
-  for (int q = -b; q <= b; ++q) {
-    const uint8_t* v = pixel_lanes<P>(base, stride, clamp_index(q, n));
-    for (int l = 0; l < L; ++l) sum[l] += v[l];
+// The binomial sum of 2Q + 1 rows of `bytes` bytes.
+template <int Q>
+void blur_column(const uint8_t* const* rows, uint8_t* out, int bytes) {
+  static constexpr std::array<uint16_t, 2 * Q + 1> W = binomial<Q>();
+  constexpr int shift = 2 * Q;
+  constexpr uint16_t half = 1u << (shift - 1);
+  int i = 0;
+  for (; i + 8 <= bytes; i += 8) {
+    u16x8 s = u16x8{} + half + W[Q] * load8(rows[Q] + i);
+    for (int j = 0; j < Q; ++j) s += W[j] * (load8(rows[j] + i) + load8(rows[2 * Q - j] + i));
+    store8(out + i, s >> shift);
   }
-  for (int p = 0; p < n; ++p) {
-    uint32_t* o = out + static_cast<size_t>(p) * L;
-    for (int l = 0; l < L; ++l) o[l] = sum[l];
-    const uint8_t* add = pixel_lanes<P>(base, stride, clamp_index(p + b + 1, n));
-    const uint8_t* sub = pixel_lanes<P>(base, stride, clamp_index(p - b, n));
-    for (int l = 0; l < L; ++l) sum[l] += static_cast<uint32_t>(add[l]) - sub[l];
-  }
-}
-
-// Second box, between line buffers.
-template <int P>
-void box_between(const uint32_t* in, int n, int b, uint32_t* out) {
-  constexpr int L = 4 * P;
-  uint32_t sum[L] = {};
-  for (int q = -b; q <= b; ++q) {
-    const uint32_t* v = in + static_cast<size_t>(clamp_index(q, n)) * L;
-    for (int l = 0; l < L; ++l) sum[l] += v[l];
-  }
-  for (int p = 0; p < n; ++p) {
-    uint32_t* o = out + static_cast<size_t>(p) * L;
-    for (int l = 0; l < L; ++l) o[l] = sum[l];
-    const uint32_t* add = in + static_cast<size_t>(clamp_index(p + b + 1, n)) * L;
-    const uint32_t* sub = in + static_cast<size_t>(clamp_index(p - b, n)) * L;
-    for (int l = 0; l < L; ++l) sum[l] += add[l] - sub[l];
-  }
-}
-
-// Third box into pixels: each R, G, B lane becomes round(sum / N); the
-// alpha byte comes from the line's source pixel.
-template <int P>
-void box_to_pixels(const uint32_t* in, int n, int b, const Boxes& boxes, const uint32_t* alpha, uint32_t* base,
-                   size_t stride) {
-  constexpr int L = 4 * P;
-  uint32_t sum[L] = {};
-  for (int q = -b; q <= b; ++q) {
-    const uint32_t* v = in + static_cast<size_t>(clamp_index(q, n)) * L;
-    for (int l = 0; l < L; ++l) sum[l] += v[l];
-  }
-  for (int p = 0; p < n; ++p) {
-    uint32_t* px = base + static_cast<size_t>(p) * stride;
-    const uint32_t* al = alpha + static_cast<size_t>(p) * stride;
-    uint32_t value[L];
-    for (int l = 0; l < L; ++l)
-      value[l] = static_cast<uint32_t>((static_cast<uint64_t>(sum[l] + boxes.half) * boxes.reciprocal) >> 32);
-    for (int k = 0; k < P; ++k)
-      px[k] = (al[k] & 0xFF000000u) | value[4 * k + 2] << 16 | value[4 * k + 1] << 8 | value[4 * k];
-    const uint32_t* add = in + static_cast<size_t>(clamp_index(p + b + 1, n)) * L;
-    const uint32_t* sub = in + static_cast<size_t>(clamp_index(p - b, n)) * L;
-    for (int l = 0; l < L; ++l) sum[l] += add[l] - sub[l];
+  for (; i < bytes; ++i) {
+    unsigned s = half;
+    for (int j = 0; j < 2 * Q + 1; ++j) s += W[j] * rows[j][i];
+    out[i] = static_cast<uint8_t>(s >> shift);
   }
 }
 
-// One line of n positions of P pixels (stride apart) from src into dst.
-template <int P>
-void blur_line(const uint32_t* src, uint32_t* dst, size_t stride, int n, const Boxes& boxes, uint32_t* a,
-               uint32_t* b) {
-  box_from_pixels<P>(src, stride, n, boxes.b[0], a);
-  box_between<P>(a, n, boxes.b[1], b);
-  box_to_pixels<P>(b, n, boxes.b[2], boxes, src, dst, stride);
+// d[x] = the alpha of a[x] with the colour of c[x], for n pixels.
+void with_alpha(uint32_t* d, const uint32_t* a, const uint32_t* c, int n) {
+  int x = 0;
+  for (; x + 4 <= n; x += 4) {
+    u32x4 va, vc;
+    std::memcpy(&va, a + x, 16);
+    std::memcpy(&vc, c + x, 16);
+    const u32x4 v = (va & 0xFF000000u) | (vc & 0xFFFFFFu);
+    std::memcpy(d + x, &v, 16);
+  }
+  for (; x < n; ++x) d[x] = (a[x] & 0xFF000000u) | (c[x] & 0xFFFFFFu);
+}
+
+// Rows y0..y1 of the blur of src (w x h) into dst with the alpha of
+// alpha_src; `work` holds 2Q + 2 rows of w pixels.
+template <int Q>
+void blur_band(const uint32_t* src, const uint32_t* alpha_src, uint32_t* dst, int w, int h, int y0, int y1,
+               uint8_t* work) {
+  const size_t row_bytes = static_cast<size_t>(w) * 4;
+  uint8_t* ring = work;
+  uint8_t* line = work + (2 * Q + 1) * row_bytes;
+  auto slot = [&](int y) { return ring + static_cast<size_t>(y % (2 * Q + 1)) * row_bytes; };
+  int made = y0 - Q > 0 ? y0 - Q : 0;  // next horizontal row to make
+  for (int y = y0; y < y1; ++y) {
+    const int last = y + Q < h ? y + Q : h - 1;
+    for (; made <= last; ++made) {
+      blur_row<Q>(reinterpret_cast<const uint8_t*>(src + static_cast<size_t>(made) * w), slot(made), w);
+    }
+    const uint8_t* rows[2 * Q + 1];
+    for (int j = 0; j < 2 * Q + 1; ++j) rows[j] = slot(clamp_index(y + j - Q, h));
+    blur_column<Q>(rows, line, static_cast<int>(row_bytes));
+    with_alpha(dst + static_cast<size_t>(y) * w, alpha_src + static_cast<size_t>(y) * w,
+               reinterpret_cast<const uint32_t*>(line), w);
+  }
+}
+
+// Bytes of one band's working memory for the blur of radius q on rows of w pixels.
+uint64_t blur_work_bytes(int q, int w) { return static_cast<uint64_t>(2 * q + 2) * static_cast<uint64_t>(w) * 4; }
+
+// round(v / d) by a 32-bit reciprocal rounded up (d >= 2; exact for the
+// sums of a constant picture).
+inline uint32_t reciprocal_of(uint32_t d) { return static_cast<uint32_t>(((uint64_t{1} << 32) + d - 1) / d); }
+inline uint32_t divide(uint32_t v, uint32_t half, uint32_t reciprocal) {
+  return static_cast<uint32_t>((static_cast<uint64_t>(v + half) * reciprocal) >> 32);
 }
 
 struct Job {
-  const uint32_t* src;
+  const uint32_t* src;  // the picture read (a copy when blurring in place at full size)
+  const uint32_t* alpha;
   uint32_t* dst;
-  int width, height;
-  Boxes boxes;
-  unsigned char* memory;
+  int w, h;
+  int q;  // radius of the blur proper
+  int k;  // block side (1: full size)
+  int rw, rh;
+  uint32_t* reduced;  // rw x rh
+  uint32_t* blurred;  // rw x rh
+  int* col0;          // interpolation: left block, right block, weight of the right one (of 256)
+  int* col1;
+  int* colf;
+  unsigned char* slots;
   size_t slot_bytes;
   std::atomic<int> next_slot{0};
 
-  // Two line buffers of one band.
-  uint32_t* take_slot() {
-    return reinterpret_cast<uint32_t*>(memory + slot_bytes * static_cast<size_t>(next_slot.fetch_add(1)));
-  }
-  // Elements of one line buffer: a row of pixels or a stripe of all rows.
-  uint64_t line_elements() const {
-    const uint64_t row = static_cast<uint64_t>(width) * 4;
-    const uint64_t stripe = static_cast<uint64_t>(height) * kMaxLanes;
-    return row > stripe ? row : stripe;
-  }
+  unsigned char* take_slot() { return slots + slot_bytes * static_cast<size_t>(next_slot.fetch_add(1)); }
 };
 
-void horizontal(Job& job, int y0, int y1) {
-  uint32_t* a = job.take_slot();
-  uint32_t* b = a + job.line_elements();
-  const size_t w = static_cast<size_t>(job.width);
-  for (int y = y0; y < y1; ++y) blur_line<1>(job.src + y * w, job.dst + y * w, 1, job.width, job.boxes, a, b);
+void blur(Job& job, const uint32_t* src, const uint32_t* alpha, uint32_t* dst, int w, int h, int q, int y0, int y1) {
+  auto* work = job.take_slot();
+  switch (q) {
+    case 1: blur_band<1>(src, alpha, dst, w, h, y0, y1, work); break;
+    case 2: blur_band<2>(src, alpha, dst, w, h, y0, y1, work); break;
+    case 3: blur_band<3>(src, alpha, dst, w, h, y0, y1, work); break;
+    default: blur_band<4>(src, alpha, dst, w, h, y0, y1, work); break;
+  }
 }
 
-// Stripes s0..s1 of kStripe columns; the band holding the last stripe also
-// does the columns past the whole stripes.
-void vertical(Job& job, int s0, int s1) {
-  uint32_t* a = job.take_slot();
-  uint32_t* b = a + job.line_elements();
-  const size_t w = static_cast<size_t>(job.width);
-  const int whole = job.width / kStripe;
-  for (int s = s0; s < s1; ++s) {
-    if (s < whole) {
-      uint32_t* col = job.dst + static_cast<size_t>(s) * kStripe;
-      blur_line<kStripe>(col, col, w, job.height, job.boxes, a, b);
-    } else {
-      for (int x = whole * kStripe; x < job.width; ++x) blur_line<1>(job.dst + x, job.dst + x, w, job.height, job.boxes, a, b);
+// Reduced rows j0..j1: the rounded means of the k x k blocks. The column
+// sums of a block row fit 16 bits (k <= 67).
+void reduce(Job& job, int j0, int j1) {
+  auto* sums = reinterpret_cast<uint16_t*>(job.take_slot());
+  const int w = job.w, k = job.k;
+  const int lanes = 4 * w;
+  for (int j = j0; j < j1; ++j) {
+    const int y0 = j * k, y1 = y0 + k < job.h ? y0 + k : job.h;
+    std::memset(sums, 0, static_cast<size_t>(lanes) * 2);
+    for (int y = y0; y < y1; ++y) {
+      const auto* row = reinterpret_cast<const uint8_t*>(job.src + static_cast<size_t>(y) * w);
+      int i = 0;
+      for (; i + 8 <= lanes; i += 8) {
+        u16x8 s;
+        std::memcpy(&s, sums + i, 16);
+        s += load8(row + i);
+        std::memcpy(sums + i, &s, 16);
+      }
+      for (; i < lanes; ++i) sums[i] = static_cast<uint16_t>(sums[i] + row[i]);
+    }
+    uint32_t* out = job.reduced + static_cast<size_t>(j) * job.rw;
+    const uint32_t full = static_cast<uint32_t>(k * (y1 - y0));
+    const uint32_t full_rec = full > 1 ? reciprocal_of(full) : 0;
+    for (int i = 0; i < job.rw; ++i) {
+      const int x0 = i * k, x1 = x0 + k < w ? x0 + k : w;
+      const uint32_t count = static_cast<uint32_t>((x1 - x0) * (y1 - y0));
+      const uint32_t rec = count == full ? full_rec : (count > 1 ? reciprocal_of(count) : 0);
+      uint32_t s[4] = {};
+      for (int x = x0; x < x1; ++x) {
+        for (int c = 0; c < 4; ++c) s[c] += sums[4 * x + c];
+      }
+      if (count == 1) {  // a corner block of one pixel (the reciprocal needs 33 bits)
+        out[i] = 0xFF000000u | s[2] << 16 | s[1] << 8 | s[0];
+        continue;
+      }
+      out[i] = 0xFF000000u | divide(s[2], count / 2, rec) << 16 | divide(s[1], count / 2, rec) << 8 |
+               divide(s[0], count / 2, rec);
     }
   }
 }
 
-constexpr int kMinRowsPerBand = 32;
-constexpr int kMinStripesPerBand = 2;
+// The blurred block row i enlarged across to w pixels (each lane rounded),
+// two pixels at a time.
+void enlarge_row(const Job& job, int i, uint8_t* out) {
+  const auto* row = reinterpret_cast<const uint8_t*>(job.blurred + static_cast<size_t>(i) * job.rw);
+  int x = 0;
+  for (; x + 2 <= job.w; x += 2) {
+    u8x8 p, q;
+    std::memcpy(&p, row + 4 * job.col0[x], 4);
+    std::memcpy(reinterpret_cast<uint8_t*>(&p) + 4, row + 4 * job.col0[x + 1], 4);
+    std::memcpy(&q, row + 4 * job.col1[x], 4);
+    std::memcpy(reinterpret_cast<uint8_t*>(&q) + 4, row + 4 * job.col1[x + 1], 4);
+    const uint16_t f0 = static_cast<uint16_t>(job.colf[x]), f1 = static_cast<uint16_t>(job.colf[x + 1]);
+    const u16x8 wq = {f0, f0, f0, f0, f1, f1, f1, f1};
+    const u16x8 wp = 256 - wq;
+    store8(out + 4 * x, (wp * __builtin_convertvector(p, u16x8) + wq * __builtin_convertvector(q, u16x8) + 128) >> 8);
+  }
+  for (; x < job.w; ++x) {
+    const uint8_t* p = row + 4 * job.col0[x];
+    const uint8_t* q = row + 4 * job.col1[x];
+    const unsigned wq = static_cast<unsigned>(job.colf[x]), wp = 256 - wq;
+    for (int c = 0; c < 4; ++c) out[4 * x + c] = static_cast<uint8_t>((wp * p[c] + wq * q[c] + 128) >> 8);
+  }
+}
+
+// Output rows y0..y1: the blurred blocks interpolated back to full size,
+// across first (block rows enlarged once each and kept while rows use
+// them), then down.
+void enlarge(Job& job, int y0, int y1) {
+  auto* work = job.take_slot();
+  const size_t row_bytes = static_cast<size_t>(job.w) * 4;
+  uint8_t* across[2] = {work, work + row_bytes};
+  uint8_t* line = work + 2 * row_bytes;
+  int held[2] = {-1, -1};  // the block rows in across[]
+  const int k2 = 2 * job.k;
+  for (int y = y0; y < y1; ++y) {
+    // Block coordinate of the row's centre in units of 1 / 2k.
+    const int t = 2 * y + 1 - job.k;
+    const int i0 = t >= 0 ? t / k2 : -((-t + k2 - 1) / k2);
+    const int a = clamp_index(i0, job.rh), b = clamp_index(i0 + 1, job.rh);
+    const uint8_t* rows[2];
+    for (int n = 0; n < 2; ++n) {
+      const int want = n == 0 ? a : b;
+      int at = held[0] == want ? 0 : (held[1] == want ? 1 : -1);
+      if (at < 0) {
+        at = (held[0] == a || held[0] == b) ? 1 : 0;
+        enlarge_row(job, want, across[at]);
+        held[at] = want;
+      }
+      rows[n] = across[at];
+    }
+    const uint16_t fb = static_cast<uint16_t>(((t - i0 * k2) * 256 + job.k) / k2), fa = static_cast<uint16_t>(256 - fb);
+    const int lanes = static_cast<int>(row_bytes);
+    int i = 0;
+    for (; i + 8 <= lanes; i += 8) store8(line + i, (fa * load8(rows[0] + i) + fb * load8(rows[1] + i) + 128) >> 8);
+    for (; i < lanes; ++i) line[i] = static_cast<uint8_t>((fa * rows[0][i] + fb * rows[1][i] + 128) >> 8);
+    with_alpha(job.dst + static_cast<size_t>(y) * job.w, job.alpha + static_cast<size_t>(y) * job.w,
+               reinterpret_cast<const uint32_t*>(line), job.w);
+  }
+}
 }  // namespace
 
 int IEL_Apply_VariableBlur(structIELImage* input, structIELImage* output, structIELEffectParams* params) {
@@ -205,28 +322,81 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
     if (dst != src) std::memmove(dst, src, static_cast<size_t>(w) * static_cast<size_t>(h) * 4);
     return IEL_OK;
   }
-  Job job{src, dst, w, h, boxes_of(radius), nullptr, 0};
-  // Whole stripes, plus one for the columns left over.
-  const int stripes = (w + kStripe - 1) / kStripe;
+  if (radius > kMaxRadius) radius = kMaxRadius;
+  Job job{src, src, dst, w, h, radius, 1, w, h, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, 0};
+  if (radius > kDirectRadius) {
+    job.q = kReducedRadius;
+    job.k = (2 * radius + 4) / 9 > 2 ? (2 * radius + 4) / 9 : 2;
+    job.rw = (w + job.k - 1) / job.k;
+    job.rh = (h + job.k - 1) / job.k;
+  }
+  const bool direct = job.k == 1;
+  const uint64_t pixels = static_cast<uint64_t>(w) * static_cast<uint64_t>(h);
+  const uint64_t reduced_pixels = static_cast<uint64_t>(job.rw) * static_cast<uint64_t>(job.rh);
+  // Working memory, sized in 64 bits: one allocation holds at most 2^31 - 1 bytes.
+  uint64_t slot = blur_work_bytes(job.q, job.rw);
+  if (!direct) {
+    const uint64_t sums = static_cast<uint64_t>(w) * 8, rows = static_cast<uint64_t>(w) * 12;
+    if (sums > slot) slot = sums;
+    if (rows > slot) slot = rows;
+  }
+  slot = (slot + 15) & ~15ull;
   const int row_bands = px_band_count(h, kMinRowsPerBand);
-  const int stripe_bands = px_band_count(stripes, kMinStripesPerBand);
-  const int slots = row_bands + stripe_bands;
-  // Sizes are worked out in 64 bits: one allocation holds at most 2^31 - 1 bytes.
-  const uint64_t slot = (2 * job.line_elements() * sizeof(uint32_t) + 15) & ~15ull;
-  const uint64_t total = slot * static_cast<uint64_t>(slots);
-  job.slot_bytes = static_cast<size_t>(slot);
-  job.memory = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
-  if (!job.memory) {
+  const int reduced_bands = px_band_count(job.rh, kMinRowsPerBand);
+  const int slots = row_bands > reduced_bands ? row_bands : reduced_bands;
+  const bool copy = direct && dst == src;
+  uint64_t total = slot * static_cast<uint64_t>(slots);
+  const uint64_t pictures = direct ? (copy ? pixels * 4 : 0) : reduced_pixels * 8 + static_cast<uint64_t>(w) * 12;
+  total += pictures;
+  unsigned char* memory = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
+  if (!memory) {
     // Kept as it always was: the failure is logged and reported as success.
     IF_ERROR("Failed to allocate \n");
-    IF_FREE(job.memory);
+    IF_FREE(memory);
     return IEL_OK;
   }
-  progress.start(2);
-  px_for_rows(h, [&job](int y0, int y1) { horizontal(job, y0, y1); }, kMinRowsPerBand);
+  job.slots = memory;
+  job.slot_bytes = static_cast<size_t>(slot);
+  unsigned char* rest = memory + slot * static_cast<uint64_t>(slots);
+  if (direct) {
+    if (copy) {
+      std::memcpy(rest, src, static_cast<size_t>(pixels) * 4);
+      job.src = job.alpha = reinterpret_cast<const uint32_t*>(rest);
+    }
+    progress.start(1);
+    px_for_rows(
+        h, [&job](int y0, int y1) { blur(job, job.src, job.alpha, job.dst, job.w, job.h, job.q, y0, y1); },
+        kMinRowsPerBand);
+    progress.advance();
+    IF_FREE(memory);
+    return IEL_OK;
+  }
+  job.reduced = reinterpret_cast<uint32_t*>(rest);
+  job.blurred = job.reduced + reduced_pixels;
+  job.col0 = reinterpret_cast<int*>(job.blurred + reduced_pixels);
+  job.col1 = job.col0 + w;
+  job.colf = job.col1 + w;
+  const int k2 = 2 * job.k;
+  for (int x = 0; x < w; ++x) {
+    const int t = 2 * x + 1 - job.k;
+    const int i0 = t >= 0 ? t / k2 : -((-t + k2 - 1) / k2);
+    job.col0[x] = clamp_index(i0, job.rw);
+    job.col1[x] = clamp_index(i0 + 1, job.rw);
+    job.colf[x] = ((t - i0 * k2) * 256 + job.k) / k2;
+  }
+  progress.start(3);
+  px_for_rows(job.rh, [&job](int j0, int j1) { reduce(job, j0, j1); }, kMinRowsPerBand);
   progress.advance();
-  px_for_rows(stripes, [&job](int s0, int s1) { vertical(job, s0, s1); }, kMinStripesPerBand);
+  job.next_slot = 0;
+  px_for_rows(
+      job.rh,
+      [&job](int j0, int j1) { blur(job, job.reduced, job.reduced, job.blurred, job.rw, job.rh, job.q, j0, j1); },
+      kMinRowsPerBand);
   progress.advance();
-  IF_FREE(job.memory);
+  // The output is written last, so it may be the input.
+  job.next_slot = 0;
+  px_for_rows(h, [&job](int y0, int y1) { enlarge(job, y0, y1); }, kMinRowsPerBand);
+  progress.advance();
+  IF_FREE(memory);
   return IEL_OK;
 }
