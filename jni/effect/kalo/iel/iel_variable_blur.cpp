@@ -50,7 +50,9 @@ constexpr int kMinRowsPerBand = 16;
 // on the host, NEON on ARM, plain code elsewhere).
 typedef uint8_t u8x8 __attribute__((vector_size(8)));
 typedef uint16_t u16x8 __attribute__((vector_size(16)));
+typedef uint16_t u16x4 __attribute__((vector_size(8)));
 typedef uint32_t u32x4 __attribute__((vector_size(16)));
+typedef uint32_t u32x2 __attribute__((vector_size(8)));
 
 inline u16x8 load8(const uint8_t* p) {
   u8x8 v;
@@ -59,6 +61,16 @@ inline u16x8 load8(const uint8_t* p) {
 }
 inline void store8(uint8_t* p, u16x8 v) {
   const u8x8 b = __builtin_convertvector(v, u8x8);
+  std::memcpy(p, &b, 8);
+}
+
+// Two pixels' colour bytes from v with the alpha bytes of the two pixels at a.
+inline void store8_alpha(uint8_t* p, u16x8 v, const uint8_t* a) {
+  const u8x8 colour = __builtin_convertvector(v, u8x8);
+  u8x8 alpha;
+  std::memcpy(&alpha, a, 8);
+  const u8x8 mask = {0, 0, 0, 0xFF, 0, 0, 0, 0xFF};
+  const u8x8 b = (colour & ~mask) | (alpha & mask);
   std::memcpy(p, &b, 8);
 }
 
@@ -102,9 +114,10 @@ void blur_row(const uint8_t* in, uint8_t* out, int n) {
   for (; x < n; ++x) edge(x);
 }
 
-// The binomial sum of 2Q + 1 rows of `bytes` bytes.
+// The binomial sum of 2Q + 1 rows of `bytes` bytes (a multiple of 4) into
+// out, each pixel's alpha byte taken from `alpha`.
 template <int Q>
-void blur_column(const uint8_t* const* rows, uint8_t* out, int bytes) {
+void blur_column(const uint8_t* const* rows, uint8_t* out, const uint8_t* alpha, int bytes) {
   static constexpr std::array<uint16_t, 2 * Q + 1> W = binomial<Q>();
   constexpr int shift = 2 * Q;
   constexpr uint16_t half = 1u << (shift - 1);
@@ -112,36 +125,26 @@ void blur_column(const uint8_t* const* rows, uint8_t* out, int bytes) {
   for (; i + 8 <= bytes; i += 8) {
     u16x8 s = u16x8{} + half + W[Q] * load8(rows[Q] + i);
     for (int j = 0; j < Q; ++j) s += W[j] * (load8(rows[j] + i) + load8(rows[2 * Q - j] + i));
-    store8(out + i, s >> shift);
+    store8_alpha(out + i, s >> shift, alpha + i);
   }
   for (; i < bytes; ++i) {
+    if (i % 4 == 3) {
+      out[i] = alpha[i];
+      continue;
+    }
     unsigned s = half;
     for (int j = 0; j < 2 * Q + 1; ++j) s += W[j] * rows[j][i];
     out[i] = static_cast<uint8_t>(s >> shift);
   }
 }
 
-// d[x] = the alpha of a[x] with the colour of c[x], for n pixels.
-void with_alpha(uint32_t* d, const uint32_t* a, const uint32_t* c, int n) {
-  int x = 0;
-  for (; x + 4 <= n; x += 4) {
-    u32x4 va, vc;
-    std::memcpy(&va, a + x, 16);
-    std::memcpy(&vc, c + x, 16);
-    const u32x4 v = (va & 0xFF000000u) | (vc & 0xFFFFFFu);
-    std::memcpy(d + x, &v, 16);
-  }
-  for (; x < n; ++x) d[x] = (a[x] & 0xFF000000u) | (c[x] & 0xFFFFFFu);
-}
-
 // Rows y0..y1 of the blur of src (w x h) into dst with the alpha of
-// alpha_src; `work` holds 2Q + 2 rows of w pixels.
+// alpha_src; `work` holds 2Q + 1 rows of w pixels.
 template <int Q>
 void blur_band(const uint32_t* src, const uint32_t* alpha_src, uint32_t* dst, int w, int h, int y0, int y1,
                uint8_t* work) {
   const size_t row_bytes = static_cast<size_t>(w) * 4;
   uint8_t* ring = work;
-  uint8_t* line = work + (2 * Q + 1) * row_bytes;
   auto slot = [&](int y) { return ring + static_cast<size_t>(y % (2 * Q + 1)) * row_bytes; };
   int made = y0 - Q > 0 ? y0 - Q : 0;  // next horizontal row to make
   for (int y = y0; y < y1; ++y) {
@@ -151,14 +154,13 @@ void blur_band(const uint32_t* src, const uint32_t* alpha_src, uint32_t* dst, in
     }
     const uint8_t* rows[2 * Q + 1];
     for (int j = 0; j < 2 * Q + 1; ++j) rows[j] = slot(clamp_index(y + j - Q, h));
-    blur_column<Q>(rows, line, static_cast<int>(row_bytes));
-    with_alpha(dst + static_cast<size_t>(y) * w, alpha_src + static_cast<size_t>(y) * w,
-               reinterpret_cast<const uint32_t*>(line), w);
+    blur_column<Q>(rows, reinterpret_cast<uint8_t*>(dst + static_cast<size_t>(y) * w),
+                   reinterpret_cast<const uint8_t*>(alpha_src + static_cast<size_t>(y) * w), static_cast<int>(row_bytes));
   }
 }
 
 // Bytes of one band's working memory for the blur of radius q on rows of w pixels.
-uint64_t blur_work_bytes(int q, int w) { return static_cast<uint64_t>(2 * q + 2) * static_cast<uint64_t>(w) * 4; }
+uint64_t blur_work_bytes(int q, int w) { return static_cast<uint64_t>(2 * q + 1) * static_cast<uint64_t>(w) * 4; }
 
 // round(v / d) by a 32-bit reciprocal rounded up (d >= 2; exact for the
 // sums of a constant picture).
@@ -177,9 +179,7 @@ struct Job {
   int rw, rh;
   uint32_t* reduced;  // rw x rh
   uint32_t* blurred;  // rw x rh
-  int* col0;          // interpolation: left block, right block, weight of the right one (of 256)
-  int* col1;
-  int* colf;
+  uint16_t phase[kMaxRadius];  // interpolation across: weight of the right block (of 256) by phase in a span
   unsigned char* slots;
   size_t slot_bytes;
   std::atomic<int> next_slot{0};
@@ -224,9 +224,11 @@ void reduce(Job& job, int j0, int j1) {
       const int x0 = i * k, x1 = x0 + k < w ? x0 + k : w;
       const uint32_t count = static_cast<uint32_t>((x1 - x0) * (y1 - y0));
       const uint32_t rec = count == full ? full_rec : (count > 1 ? reciprocal_of(count) : 0);
-      uint32_t s[4] = {};
+      u32x4 s = {};
       for (int x = x0; x < x1; ++x) {
-        for (int c = 0; c < 4; ++c) s[c] += sums[4 * x + c];
+        u16x4 v;
+        std::memcpy(&v, sums + 4 * x, 8);
+        s += __builtin_convertvector(v, u32x4);
       }
       if (count == 1) {  // a corner block of one pixel (the reciprocal needs 33 bits)
         out[i] = 0xFF000000u | s[2] << 16 | s[1] << 8 | s[0];
@@ -238,28 +240,41 @@ void reduce(Job& job, int j0, int j1) {
   }
 }
 
-// The blurred block row i enlarged across to w pixels (each lane rounded),
-// two pixels at a time.
+// The blurred block row i enlarged across to w pixels (each lane rounded).
+// Pixels left of the first block centre and right of the last take those
+// blocks; in between, the k pixels of a span between two centres share the
+// pair of blocks and take the weights of their phase (the same for every
+// span), two pixels at a time.
 void enlarge_row(const Job& job, int i, uint8_t* out) {
-  const auto* row = reinterpret_cast<const uint8_t*>(job.blurred + static_cast<size_t>(i) * job.rw);
-  int x = 0;
-  for (; x + 2 <= job.w; x += 2) {
-    u8x8 p, q;
-    std::memcpy(&p, row + 4 * job.col0[x], 4);
-    std::memcpy(reinterpret_cast<uint8_t*>(&p) + 4, row + 4 * job.col0[x + 1], 4);
-    std::memcpy(&q, row + 4 * job.col1[x], 4);
-    std::memcpy(reinterpret_cast<uint8_t*>(&q) + 4, row + 4 * job.col1[x + 1], 4);
-    const uint16_t f0 = static_cast<uint16_t>(job.colf[x]), f1 = static_cast<uint16_t>(job.colf[x + 1]);
-    const u16x8 wq = {f0, f0, f0, f0, f1, f1, f1, f1};
-    const u16x8 wp = 256 - wq;
-    store8(out + 4 * x, (wp * __builtin_convertvector(p, u16x8) + wq * __builtin_convertvector(q, u16x8) + 128) >> 8);
+  const auto* row = reinterpret_cast<const uint32_t*>(job.blurred + static_cast<size_t>(i) * job.rw);
+  auto* o = reinterpret_cast<uint32_t*>(out);
+  const int w = job.w, k = job.k, x0 = k / 2 < w ? k / 2 : w;
+  for (int x = 0; x < x0; ++x) o[x] = row[0];
+  // The weights of each pair of phases, lane by lane.
+  u16x8 pair[kMaxRadius / 2 + 1];
+  for (int p = 0; p + 1 < k; p += 2) {
+    const uint16_t f0 = job.phase[p], f1 = job.phase[p + 1];
+    pair[p / 2] = u16x8{f0, f0, f0, f0, f1, f1, f1, f1};
   }
-  for (; x < job.w; ++x) {
-    const uint8_t* p = row + 4 * job.col0[x];
-    const uint8_t* q = row + 4 * job.col1[x];
-    const unsigned wq = static_cast<unsigned>(job.colf[x]), wp = 256 - wq;
-    for (int c = 0; c < 4; ++c) out[4 * x + c] = static_cast<uint8_t>((wp * p[c] + wq * q[c] + 128) >> 8);
+  int x = x0;
+  u16x8 q = __builtin_convertvector(reinterpret_cast<u8x8>(u32x2{row[0], row[0]}), u16x8);
+  for (int b = 0; b + 1 < job.rw && x < w; ++b) {
+    const u16x8 p = q;
+    q = __builtin_convertvector(reinterpret_cast<u8x8>(u32x2{row[b + 1], row[b + 1]}), u16x8);
+    const int end = x + k < w ? x + k : w;
+    int phase = 0;
+    for (; x + 2 <= end; x += 2, phase += 2) {
+      const u16x8 wq = pair[phase / 2];
+      store8(out + 4 * static_cast<size_t>(x), ((256 - wq) * p + wq * q + 128) >> 8);
+    }
+    for (; x < end; ++x, ++phase) {
+      const unsigned wq = job.phase[phase], wp = 256 - wq;
+      const auto* pb = reinterpret_cast<const uint8_t*>(row + b);
+      const auto* qb = reinterpret_cast<const uint8_t*>(row + b + 1);
+      for (int c = 0; c < 4; ++c) out[4 * x + c] = static_cast<uint8_t>((wp * pb[c] + wq * qb[c] + 128) >> 8);
+    }
   }
+  for (; x < w; ++x) o[x] = row[job.rw - 1];
 }
 
 // Output rows y0..y1: the blurred blocks interpolated back to full size,
@@ -269,7 +284,6 @@ void enlarge(Job& job, int y0, int y1) {
   auto* work = job.take_slot();
   const size_t row_bytes = static_cast<size_t>(job.w) * 4;
   uint8_t* across[2] = {work, work + row_bytes};
-  uint8_t* line = work + 2 * row_bytes;
   int held[2] = {-1, -1};  // the block rows in across[]
   const int k2 = 2 * job.k;
   for (int y = y0; y < y1; ++y) {
@@ -290,11 +304,15 @@ void enlarge(Job& job, int y0, int y1) {
     }
     const uint16_t fb = static_cast<uint16_t>(((t - i0 * k2) * 256 + job.k) / k2), fa = static_cast<uint16_t>(256 - fb);
     const int lanes = static_cast<int>(row_bytes);
+    auto* d = reinterpret_cast<uint8_t*>(job.dst + static_cast<size_t>(y) * job.w);
+    const auto* al = reinterpret_cast<const uint8_t*>(job.alpha + static_cast<size_t>(y) * job.w);
     int i = 0;
-    for (; i + 8 <= lanes; i += 8) store8(line + i, (fa * load8(rows[0] + i) + fb * load8(rows[1] + i) + 128) >> 8);
-    for (; i < lanes; ++i) line[i] = static_cast<uint8_t>((fa * rows[0][i] + fb * rows[1][i] + 128) >> 8);
-    with_alpha(job.dst + static_cast<size_t>(y) * job.w, job.alpha + static_cast<size_t>(y) * job.w,
-               reinterpret_cast<const uint32_t*>(line), job.w);
+    for (; i + 8 <= lanes; i += 8) {
+      store8_alpha(d + i, (fa * load8(rows[0] + i) + fb * load8(rows[1] + i) + 128) >> 8, al + i);
+    }
+    for (; i < lanes; ++i) {
+      d[i] = i % 4 == 3 ? al[i] : static_cast<uint8_t>((fa * rows[0][i] + fb * rows[1][i] + 128) >> 8);
+    }
   }
 }
 }  // namespace
@@ -323,7 +341,7 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
     return IEL_OK;
   }
   if (radius > kMaxRadius) radius = kMaxRadius;
-  Job job{src, src, dst, w, h, radius, 1, w, h, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, 0};
+  Job job{src, src, dst, w, h, radius, 1, w, h, nullptr, nullptr, {}, nullptr, 0};
   if (radius > kDirectRadius) {
     job.q = kReducedRadius;
     job.k = (2 * radius + 4) / 9 > 2 ? (2 * radius + 4) / 9 : 2;
@@ -336,7 +354,7 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   // Working memory, sized in 64 bits: one allocation holds at most 2^31 - 1 bytes.
   uint64_t slot = blur_work_bytes(job.q, job.rw);
   if (!direct) {
-    const uint64_t sums = static_cast<uint64_t>(w) * 8, rows = static_cast<uint64_t>(w) * 12;
+    const uint64_t sums = static_cast<uint64_t>(w) * 8, rows = static_cast<uint64_t>(w) * 8;
     if (sums > slot) slot = sums;
     if (rows > slot) slot = rows;
   }
@@ -346,7 +364,7 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   const int slots = row_bands > reduced_bands ? row_bands : reduced_bands;
   const bool copy = direct && dst == src;
   uint64_t total = slot * static_cast<uint64_t>(slots);
-  const uint64_t pictures = direct ? (copy ? pixels * 4 : 0) : reduced_pixels * 8 + static_cast<uint64_t>(w) * 12;
+  const uint64_t pictures = direct ? (copy ? pixels * 4 : 0) : reduced_pixels * 8;
   total += pictures;
   unsigned char* memory = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
   if (!memory) {
@@ -373,16 +391,11 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   }
   job.reduced = reinterpret_cast<uint32_t*>(rest);
   job.blurred = job.reduced + reduced_pixels;
-  job.col0 = reinterpret_cast<int*>(job.blurred + reduced_pixels);
-  job.col1 = job.col0 + w;
-  job.colf = job.col1 + w;
   const int k2 = 2 * job.k;
-  for (int x = 0; x < w; ++x) {
-    const int t = 2 * x + 1 - job.k;
-    const int i0 = t >= 0 ? t / k2 : -((-t + k2 - 1) / k2);
-    job.col0[x] = clamp_index(i0, job.rw);
-    job.col1[x] = clamp_index(i0 + 1, job.rw);
-    job.colf[x] = ((t - i0 * k2) * 256 + job.k) / k2;
+  for (int p = 0; p < job.k; ++p) {
+    // Pixel k / 2 + p lies 2 (k / 2 + p) + 1 - k 2k-ths past its left block's centre.
+    const int f = 2 * (job.k / 2 + p) + 1 - job.k;
+    job.phase[p] = static_cast<uint16_t>((f * 256 + job.k) / k2);
   }
   progress.start(3);
   px_for_rows(job.rh, [&job](int j0, int j1) { reduce(job, j0, j1); }, kMinRowsPerBand);
