@@ -321,10 +321,12 @@ bool run_blur_rows(const int* src, const unsigned char* blurred, const unsigned 
 }
 }  // namespace
 
-void run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
+bool run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
               const unsigned char* reducedMask, int* dst, int width, int height, int w, int h) {
-  if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
-  if (!px_scalar_only() && run_blur_rows(src, blurred, mask, reducedMask, dst, width, height, w, h)) return;
+  if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return true;
+  // The fast form without its working memory writes nothing: the caller
+  // reports the shortage.
+  if (!px_scalar_only()) return run_blur_rows(src, blurred, mask, reducedMask, dst, width, height, w, h);
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
   const int64_t bits = index_bits(width, height);
@@ -357,26 +359,44 @@ void run_blur(const int* src, const unsigned char* blurred, const unsigned char*
       }
     }
   });
+  return true;
 }
 
 namespace {
 // restore_tiltshift with the rows blended first, as run_blur_rows (a = the
 // row's sharpness weight). False when the working memory cannot be had.
+constexpr int kTiltRows = 64;  // rows per band of the tilt-shift restore
+
+// The working memory of restore_tiltshift_rows, taken before anything is
+// written where a caller needs that.
+struct TiltMemory {
+  Sample* cols = nullptr;
+  unsigned char* work = nullptr;
+  bool take(int width, int height, int w) {
+    cols = static_cast<Sample*>(px_malloc(static_cast<size_t>(width), sizeof(Sample)));
+    work = static_cast<unsigned char*>(
+        px_malloc(static_cast<size_t>(w) * 3 * sizeof(int32_t), static_cast<size_t>(px_band_count(height, kTiltRows))));
+    if (cols && work) return true;
+    release();
+    return false;
+  }
+  void release() {
+    px_free(cols);
+    px_free(work);
+    cols = nullptr;
+    work = nullptr;
+  }
+};
+
 bool restore_tiltshift_rows(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w,
-                            int h, int64_t d, int64_t k, int center, int halfBand) {
+                            int h, int64_t d, int64_t k, int center, int halfBand, const TiltMemory& memory) {
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
   const int64_t bits = index_bits(width, height);
-  constexpr int kMinRows = 64;
-  const int bands = px_band_count(height, kMinRows);
+  constexpr int kMinRows = kTiltRows;
   const size_t per_band = static_cast<size_t>(w) * 3 * sizeof(int32_t);
-  auto* cols = static_cast<Sample*>(px_malloc(static_cast<size_t>(width), sizeof(Sample)));
-  auto* work = static_cast<unsigned char*>(px_malloc(per_band, static_cast<size_t>(bands)));
-  if (!cols || !work) {
-    px_free(cols);
-    px_free(work);
-    return false;
-  }
+  Sample* cols = memory.cols;
+  unsigned char* work = memory.work;
   for (int x = 0; x < width; ++x) cols[x] = sample(x, stepX, w, bits);
   std::atomic<int> next{0};
   px_for_rows(
@@ -414,15 +434,24 @@ bool restore_tiltshift_rows(const int* src, const unsigned char* blurred, int* d
         }
       },
       kMinRows);
-  px_free(work);
-  px_free(cols);
   return true;
 }
+
+bool restore_tiltshift_with(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w,
+                            int h, int center, int halfBand, const TiltMemory* held);
 }  // namespace
 
-void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+bool restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
                        int center, int halfBand) {
-  if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
+  return restore_tiltshift_with(src, blurred, dst, width, height, w, h, center, halfBand, nullptr);
+}
+
+namespace {
+// restore_tiltshift with the fast form's memory already held (or taken here
+// when `held` is null); false, with nothing written, when it cannot be had.
+bool restore_tiltshift_with(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+                            int center, int halfBand, const TiltMemory* held) {
+  if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return true;
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
   const int64_t bits = index_bits(width, height);
@@ -434,8 +463,14 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
                   : (static_cast<int64_t>(height) - center - halfBand) >> 1;
   if (d < 1) d = 1;
   const int64_t k = d > 0x100000 ? 0 : (0x100000 / d) * 256;
-  if (!px_scalar_only() && restore_tiltshift_rows(src, blurred, dst, width, height, w, h, d, k, center, halfBand))
-    return;
+  if (!px_scalar_only()) {
+    if (held) return restore_tiltshift_rows(src, blurred, dst, width, height, w, h, d, k, center, halfBand, *held);
+    TiltMemory memory;
+    if (!memory.take(width, height, w)) return false;
+    restore_tiltshift_rows(src, blurred, dst, width, height, w, h, d, k, center, halfBand, memory);
+    memory.release();
+    return true;
+  }
   px_for_rows(height, [&](int y0, int y1) {
     for (int y = y0; y < y1; ++y) {
       int64_t beyond = (y > center ? static_cast<int64_t>(y) - center : static_cast<int64_t>(center) - y) - halfBand;
@@ -465,7 +500,9 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
       }
     }
   });
+  return true;
 }
+}  // namespace
 
 // ---- selective blur -----------------------------------------------------------
 
@@ -490,7 +527,7 @@ int px_Init_blur(const int* src, unsigned char* mask, int width, int height, int
 void px_make_blur_preview(const int* src, const unsigned char* mask, int* dst, int width, int height, int level) {
   if (!g_ssrc || !g_tempd || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
   if (!make_gaussian_blur(g_ssrc, g_sblur, g_tempd, g_scaled_wd, g_scaled_ht, level)) return;
-  run_blur(src, g_sblur, mask, g_tempd, dst, width, height, g_scaled_wd, g_scaled_ht);
+  run_blur(src, g_sblur, mask, g_tempd, dst, width, height, g_scaled_wd, g_scaled_ht);  // short of memory: dst as it was
 }
 
 int px_make_blur(const int* src, unsigned char* mask, int* dst, int width, int height, int level, int left,
@@ -504,8 +541,7 @@ int px_make_blur(const int* src, unsigned char* mask, int* dst, int width, int h
   scale_down_depth(mask, width, height, r.mask, r.w, r.h);
   int rc = PX_ERR_ALLOC;
   if (make_gaussian_blur(r.pic, r.blurred, r.mask, r.w, r.h, level)) {
-    run_blur(src, r.blurred, mask, r.mask, dst, width, height, r.w, r.h);
-    rc = PX_OK;
+    if (run_blur(src, r.blurred, mask, r.mask, dst, width, height, r.w, r.h)) rc = PX_OK;
   }
   r.release();
   if (whole && mask) std::memset(mask, 0, area(width, height));
@@ -538,7 +574,7 @@ int px_init_tiltshift(const int* src, int width, int height) {
 void px_tiltshift_preview(const int* src, int* dst, int width, int height, int center, int halfBand) {
   if (!g_ssrc || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
   if (!make_tiltshift(g_ssrc, g_sblur, g_scaled_wd, g_scaled_ht)) return;
-  restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);
+  restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);  // short of memory: dst as it was
 }
 
 namespace {
@@ -551,7 +587,9 @@ int tiltshift(const int* src, int* dst, int width, int height, int center, int h
   Reduced r;
   if (!allocate(r, width, height, false)) return PX_ERR_ALLOC;
   auto* scratch = static_cast<unsigned char*>(px_malloc(area(r.w, r.h), 3));
-  if (!scratch) {
+  TiltMemory rows;
+  if (!scratch || (!px_scalar_only() && !rows.take(width, height, r.w))) {
+    px_free(scratch);
     r.release();
     return PX_ERR_ALLOC;
   }
@@ -561,7 +599,9 @@ int tiltshift(const int* src, int* dst, int width, int height, int center, int h
   px_free(scratch);
   px_free(r.pic);
   r.pic = nullptr;
-  restore_tiltshift(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand);
+  restore_tiltshift_with(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand,
+                         px_scalar_only() ? nullptr : &rows);
+  rows.release();
   r.release();
   return PX_OK;
 }

@@ -103,11 +103,13 @@ bool make_gaussian_blur(const unsigned char* src, unsigned char* dst, const unsi
 // Unmasked separable blur with taps -4..4. False on allocation failure.
 bool make_tiltshift(const unsigned char* src, unsigned char* dst, int w, int h);
 
-// Selective-blur compositing of the blurred reduced picture into dst.
-void run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
+// Selective-blur compositing of the blurred reduced picture into dst. False,
+// with dst untouched, when the working memory cannot be had.
+bool run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
               const unsigned char* reducedMask, int* dst, int width, int height, int w, int h);
-// Tilt-shift restore of the blurred reduced picture into dst.
-void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+// Tilt-shift restore of the blurred reduced picture into dst. False, with dst
+// untouched, when the working memory cannot be had.
+bool restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
                        int center, int halfBand);
 
 // The "whole picture" flag of the last selective-blur initialisation.

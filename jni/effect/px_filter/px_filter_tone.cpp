@@ -435,8 +435,9 @@ void px_softglow(int* in, int* out, int width, int height) {
   if (!in || !out || width <= 0 || height <= 0) return;
   const int side = width < height ? width : height;
   const int r = side / 32 > 1 ? side / 32 : 1;
-  if (!px_scalar_only() && 2 * r + 1 < 4096 &&
-      softglow_fast(reinterpret_cast<const uint32_t*>(in), reinterpret_cast<uint32_t*>(out), width, height, r)) {
+  if (!px_scalar_only() && 2 * r + 1 < 4096) {
+    if (!softglow_fast(reinterpret_cast<const uint32_t*>(in), reinterpret_cast<uint32_t*>(out), width, height, r))
+      IF_ERROR("Low memory: %s\n", __func__);
     return;
   }
   const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);

@@ -170,8 +170,8 @@ int IEL_GaussianBlur(structIELImage* input, structIELImage* output) {
 namespace {
 // The mode filter of packed RGB with each pixel's 16-level luminance taken
 // once into a plane: the same 3 x 3 window, visited in the same order (left,
-// middle, right column, each top to bottom), picks the same pixel. False
-// when the plane could not be allocated (the plain path then runs).
+// middle, right column, each top to bottom), picks the same pixel. False,
+// with nothing written, when the plane could not be allocated.
 bool oilify_rgb_levels(const unsigned char* src, unsigned char* dst, int w, int h) {
   const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
   auto* level = n <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n))) : nullptr;
@@ -215,9 +215,9 @@ int IEL_OilifyFix(structIELImage* input, structIELImage* output) {
   const int w = input->width, h = input->height;
   const int bpp = IEL_BytesPerPixel(input->format);
   // (An output that is the input itself needs the plain path's order.)
-  if (bpp == 3 && !px_scalar_only() && input->buffer != output->buffer &&
-      oilify_rgb_levels(input->buffer, output->buffer, w, h)) {
-    return IEL_OK;
+  if (bpp == 3 && !px_scalar_only() && input->buffer != output->buffer) {
+    if (oilify_rgb_levels(input->buffer, output->buffer, w, h)) return IEL_OK;
+    return IEL_ERR_ALLOC;
   }
   const unsigned char* src = input->buffer;
   unsigned char* dst = output->buffer;
