@@ -251,13 +251,25 @@ struct Reader {
 bool oil_pastel(int* in, int* out, int* grain, int width, int height) {
   if (!usable(in, out, width, height) || !grain) return false;
   const Reader read;
+  const bool fast = read.table;
+  const size_t w = static_cast<size_t>(width);
   each_pixel(width, height, [&](int x, int y, size_t i) {
     const uint32_t p = static_cast<uint32_t>(in[i]);
     Col m{0, 0, 0};
-    for (int dy = -1; dy <= 1; ++dy) {
-      for (int dx = -1; dx <= 1; ++dx) {
-        const Col k = read(at(in, width, height, x + dx, y + dy));
-        m = {m.r + k.r, m.g + k.g, m.b + k.b};
+    if (fast && x > 0 && y > 0 && x + 1 < width && y + 1 < height) {  // no edge to repeat
+      for (int dy = -1; dy <= 1; ++dy) {
+        const int* row = in + (i + dy * w);
+        for (int dx = -1; dx <= 1; ++dx) {
+          const Col k = read_table(static_cast<uint32_t>(row[dx]));
+          m = {m.r + k.r, m.g + k.g, m.b + k.b};
+        }
+      }
+    } else {
+      for (int dy = -1; dy <= 1; ++dy) {
+        for (int dx = -1; dx <= 1; ++dx) {
+          const Col k = read(at(in, width, height, x + dx, y + dy));
+          m = {m.r + k.r, m.g + k.g, m.b + k.b};
+        }
       }
     }
     Col c = saturate({m.r / 9.0, m.g / 9.0, m.b / 9.0}, 1.35);
@@ -324,11 +336,19 @@ bool impressionist(int* in, int* out, int* strokes, int* canvas, int width, int 
     auto level = [](double v) { return std::floor(clamp(static_cast<float>(v), 0.0f, 1.0f) * 7.0 + 0.5) / 7.0; };
     work[i] = static_cast<int>(write(0, {level(c.r), level(c.g), level(c.b)}));
   });
+  const size_t w = static_cast<size_t>(width);
   each_pixel(width, height, [&](int x, int y, size_t i) {
     Col m{0, 0, 0};
-    for (int k = -2; k <= 2; ++k) {
-      const Col c = read(at(work, width, height, x + k, y + k));
-      m = {m.r + c.r, m.g + c.g, m.b + c.b};
+    if (read.table && x >= 2 && y >= 2 && x + 2 < width && y + 2 < height) {  // no edge to repeat
+      for (int k = -2; k <= 2; ++k) {
+        const Col c = read_table(static_cast<uint32_t>(work[i + k * (w + 1)]));
+        m = {m.r + c.r, m.g + c.g, m.b + c.b};
+      }
+    } else {
+      for (int k = -2; k <= 2; ++k) {
+        const Col c = read(at(work, width, height, x + k, y + k));
+        m = {m.r + c.r, m.g + c.g, m.b + c.b};
+      }
     }
     const double shade = 0.8 + 0.2 * luma(read(static_cast<uint32_t>(canvas[i])));
     out[i] = static_cast<int>(write(static_cast<uint32_t>(in[i]),
