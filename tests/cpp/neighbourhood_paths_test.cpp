@@ -245,7 +245,8 @@ TEST(NeighbourhoodPaths, BlurCompositingByBlendedRowsMatchesThePlainBilinear) {
       ASSERT_EQ(preview.fast, preview.plain) << s.w << "x" << s.h << " level " << level;
     }
     // Tilt-shift: bands in the middle, at the top edge, wider than the picture.
-    for (auto [centre, band] : {std::pair{s.h / 2, s.h / 8}, {0, 1}, {s.h - 1, s.h * 2}}) {
+    for (const std::pair<int, int>& cb : {std::pair{s.h / 2, s.h / 8}, {0, 1}, {s.h - 1, s.h * 2}}) {
+      const int centre = cb.first, band = cb.second;
       const Both tilt = both_paths([&] {
         std::vector<int> out(n, 1);
         EXPECT_EQ(px_apply_tiltshift(in.data(), out.data(), s.w, s.h, centre, band), 40960);
