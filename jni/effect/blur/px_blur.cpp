@@ -258,7 +258,8 @@ bool run_blur_rows(const int* src, const unsigned char* blurred, const unsigned 
   const int bands = px_band_count(height, kMinRows);
   // Per band: the blended reduced row (3 ints a reduced pixel) and its
   // "both rows selected" flags.
-  const size_t per_band = static_cast<size_t>(w) * 3 * sizeof(int32_t) + static_cast<size_t>(w);
+  // (Rounded up to 16 bytes, so that every band's ints are aligned.)
+  const size_t per_band = (static_cast<size_t>(w) * 3 * sizeof(int32_t) + static_cast<size_t>(w) + 15) & ~size_t{15};
   auto* cols = static_cast<Sample*>(px_malloc(static_cast<size_t>(width), sizeof(Sample)));
   auto* work = static_cast<unsigned char*>(px_malloc(per_band, static_cast<size_t>(bands)));
   if (!cols || !work) {
