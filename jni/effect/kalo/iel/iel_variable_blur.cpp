@@ -1,6 +1,6 @@
 // Effect 38, the variable blur: a smooth, Gaussian-looking blur of a given
-// radius r on ARGB pixels (sigma about r / 3, reaching about r pixels)
-// whose cost hardly grows with the radius.
+// radius r on ARGB pixels (sigma roughly r / 3, at least 0.7; reaching about
+// r pixels) whose cost hardly grows with the radius.
 //
 // Design. The blur proper has a small radius q: the binomial kernel of 2q + 1
 // taps C(2q, j) / 4^q (sigma sqrt(q / 2)), applied as one weighted sum of
@@ -11,13 +11,13 @@
 // Radii up to kDirectRadius (4) blur at full size with q = r. Larger radii
 // blur a reduced picture: blocks of k x k pixels, k = max(2, round(2r / 9)),
 // become their rounded means (the blocks of the last column and row may be
-// smaller), the reduced picture is blurred with q = 3 (q = 2 for radii 5 to 8,
-// whose blocks are 2 x 2: a sigma nearer r / 3, and less work), and every output pixel
-// is interpolated bilinearly from the blurred blocks around its centre
+// smaller), the reduced picture is blurred with q = 3 (q = 2 for radii 5 to
+// 8, whose blocks are 2 x 2: a sigma nearer r / 3, and less work), and every
+// output pixel is interpolated bilinearly from the blurred blocks around its centre
 // (pixel x lies at block coordinate (x + 0.5) / k - 0.5, clamped at the
 // borders; the weights are that position in 256ths, across first, each
-// direction rounded). The three steps add up to a sigma of about 1.3 k (q = 3),
-// about r / 3 as at full size, and an impulse spreads at most r + 2 pixels
+// direction rounded). The three steps add up to a sigma of about 1.3 k
+// (q = 3) or 1.1 k (q = 2), near r / 3, and an impulse spreads at most r + 2 pixels
 // (k (q + 1) + (k - 1) / 2 of them); a constant picture stays constant. So
 // above the direct radii the cost is one reduction and one interpolation of
 // the picture whatever the radius.
