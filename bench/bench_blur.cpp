@@ -5,6 +5,7 @@
 
 #include "bench_picture.h"
 
+#include <cstring>
 #include <random>
 #include <vector>
 
@@ -78,7 +79,7 @@ void VariableBlur(benchmark::State& s) {
   });
 }
 BENCHMARK(VariableBlur)
-    ->ArgsProduct({{1, 12}, {3, 15, 63}})
+    ->ArgsProduct({{1, 12}, {3, 7, 15, 63}})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime();
 
@@ -92,7 +93,7 @@ void OpenCvGaussianBlur(benchmark::State& s) {
   });
 }
 BENCHMARK(OpenCvGaussianBlur)
-    ->ArgsProduct({{1, 12}, {3, 15, 63}})
+    ->ArgsProduct({{1, 12}, {3, 7, 15, 63}})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime();
 #endif

@@ -6,9 +6,11 @@
 #include "bench_picture.h"
 
 #include <cstdio>
+#include <cstring>
 #include <string>
 #include <vector>
 
+#include "bench_picture.h"
 #include "effect/portrait/px_portrait.h"
 
 namespace {
@@ -65,13 +67,18 @@ Photo& session(benchmark::State& s) {
   return p;
 }
 
-void Analyse(benchmark::State& s) {
+// Analysis in detection mode 3 (upright and the two turned passes, the
+// portrait default) and mode 1 (upright only).
+void analyse(benchmark::State& s, int mode) {
   Photo& p = photo(static_cast<int>(s.range(0)));
   for (auto _ : s) {
-    if (!px_init_portrait(2, 3, 3, p.in.data(), p.width, p.height)) s.SkipWithError("no session");
+    if (!px_init_portrait(2, 3, mode, p.in.data(), p.width, p.height)) s.SkipWithError("no session");
   }
   px_finish_portrait();
+  px_set_facebeauty(2, 3, 3);
 }
+void Analyse(benchmark::State& s) { analyse(s, 3); }
+void AnalyseUpright(benchmark::State& s) { analyse(s, 1); }
 
 template <class Op>
 void run(benchmark::State& s, Op op) {
@@ -112,6 +119,7 @@ void OutfocusPreview(benchmark::State& s) {
 
 #define PORTRAIT_BENCH(name) BENCHMARK(name)->Arg(3)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 PORTRAIT_BENCH(Analyse)
+PORTRAIT_BENCH(AnalyseUpright)
 PORTRAIT_BENCH(Beautify)
 PORTRAIT_BENCH(BeautifyPreview)
 PORTRAIT_BENCH(Light)

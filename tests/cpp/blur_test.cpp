@@ -9,6 +9,7 @@
 #include "effect/blur/px_blur.h"
 #include "effect/kalo/iel/iel.h"
 #include "effect/kalo/iel/iel_variable_blur.h"
+#include "effect/kalo/px_mem.h"
 #include "effect/kalo/px_parallel.h"
 #include "effect/px_color/px_tone.h"
 #include "log_capture.h"
@@ -354,36 +355,48 @@ int variable_blur(std::vector<int>& in, std::vector<int>& out, int w, int h, int
 }
 }  // namespace
 
-TEST(VariableBlur, ImpulseSpreadsSymmetricallyToExactlyTheRadius) {
+TEST(VariableBlur, ImpulseSpreadsToTheRadiusKeepingItsEnergy) {
   const int w = 41, h = 41, c = 20;
-  for (int radius : {1, 3, 7}) {
+  // 1 and 3 blur at full size, 7 and 15 a picture reduced by 2 and 3.
+  for (int radius : {1, 3, 7, 15}) {
+    const bool direct = radius <= 4;
     std::vector<int> in(w * h, rgb(0, 0, 0, 0x40)), out(w * h);
     in[c * w + c] = rgb(255, 255, 255, 0x90);
     ASSERT_EQ(variable_blur(in, out, w, h, radius), IEL_OK);
     EXPECT_EQ(static_cast<uint32_t>(out[c * w + c]) >> 24, 0x90u);  // alpha from the input
     EXPECT_EQ(static_cast<uint32_t>(out[0]) >> 24, 0x40u);
+    // At full size exactly the radius; reduced, at most two pixels more.
+    const int reach = direct ? radius : radius + 2;
     int total = 0;
     for (int y = 0; y < h; ++y) {
       for (int x = 0; x < w; ++x) {
         const int v = chan(out[y * w + x], 1);
         total += v;
-        if (std::abs(x - c) > radius || std::abs(y - c) > radius) {
+        if (std::abs(x - c) > reach || std::abs(y - c) > reach) {
           ASSERT_EQ(v, 0) << radius;
         }
-        ASSERT_EQ(v, chan(out[y * w + (2 * c - x)], 1));  // mirror left-right
-        ASSERT_EQ(v, chan(out[(2 * c - y) * w + x], 1));  // mirror up-down
+        ASSERT_EQ(v, chan(out[y * w + x], 0));  // every channel alike
+        if (direct) {
+          ASSERT_EQ(v, chan(out[y * w + (2 * c - x)], 1));  // mirror left-right
+          ASSERT_EQ(v, chan(out[(2 * c - y) * w + x], 1));  // mirror up-down
+        }
       }
     }
-    // Peak at the centre, falling off along a row; the energy is kept.
-    for (int x = c; x < c + radius; ++x) EXPECT_GE(chan(out[c * w + x], 1), chan(out[c * w + x + 1], 1));
+    EXPECT_GT(chan(out[c * w + c + radius / 4], 1), 0) << radius;
+    if (direct) {
+      for (int x = c; x < c + radius; ++x) EXPECT_GE(chan(out[c * w + x], 1), chan(out[c * w + x + 1], 1));
+    }
     EXPECT_NEAR(total, 255, 255 / 5 + 10) << radius;
   }
 }
 
 TEST(VariableBlur, ConstantStaysConstantAndRadiusZeroCopies) {
-  std::vector<int> in(33 * 17, rgb(12, 200, 77, 0x33)), out(33 * 17);
-  ASSERT_EQ(variable_blur(in, out, 33, 17, 63), IEL_OK);
-  EXPECT_EQ(out, in);
+  // 33 x 17 leaves partial blocks, down to a corner of one pixel at radius 5.
+  for (int radius : {2, 5, 63, 300}) {
+    std::vector<int> in(33 * 17, rgb(12, 200, 77, 0x33)), out(33 * 17);
+    ASSERT_EQ(variable_blur(in, out, 33, 17, radius), IEL_OK);
+    EXPECT_EQ(out, in) << radius;
+  }
   std::vector<int> pic = random_picture(19, 7, 21), copy(19 * 7);
   ASSERT_EQ(variable_blur(pic, copy, 19, 7, 0), IEL_OK);
   EXPECT_EQ(copy, pic);
@@ -391,8 +404,10 @@ TEST(VariableBlur, ConstantStaysConstantAndRadiusZeroCopies) {
 
 TEST(VariableBlur, SameResultForAnyThreadCountAndInPlace) {
   const bool was = px_scalar_only();
-  for (auto [w, h] : {std::pair{517, 389}, {16, 900}, {1000, 3}}) {
-    for (int radius : {3, 15, 63}) {
+  // Odd widths (pixels left over from the pairs and lanes of the wide
+  // steps, partial blocks), one row, one column, pictures smaller than a block.
+  for (auto [w, h] : {std::pair{517, 389}, {16, 900}, {1000, 3}, {1, 77}, {77, 1}, {13, 5}, {3, 2}}) {
+    for (int radius : {1, 4, 5, 7, 15, 63}) {
       std::vector<int> in = random_picture(w, h, 23 + radius), fast(in.size()), scalar(in.size());
       px_set_scalar_only(false);
       ASSERT_EQ(variable_blur(in, fast, w, h, radius), IEL_OK);
@@ -402,10 +417,64 @@ TEST(VariableBlur, SameResultForAnyThreadCountAndInPlace) {
       px_set_scalar_only(was);
       std::vector<int> inplace = in;
       ASSERT_EQ(variable_blur(inplace, inplace, w, h, radius), IEL_OK);
-      EXPECT_EQ(inplace, scalar);
+      EXPECT_EQ(inplace, scalar) << w << "x" << h << " r" << radius;
     }
   }
   px_set_scalar_only(was);
+}
+
+TEST(VariableBlur, BinomialRoundsOnceAndLargeRadiiStopAt300) {
+  // Radius 3 at full size: the binomial 1, 6, 15, 20, 15, 6, 1 over 64. An
+  // impulse of 255, rounded once: 255 * 20 / 64 = 79.7 -> 80, 255 * 15 / 64
+  // = 59.8 -> 60, 255 * 6 / 64 = 23.9 -> 24, 255 / 64 = 3.98 -> 4. (A
+  // picture of one row: the vertical direction repeats the row and changes
+  // nothing.)
+  std::vector<int> in(11, rgb(0, 0, 0, 0x10)), out(11);
+  in[5] = rgb(255, 0, 0, 0x20);
+  ASSERT_EQ(variable_blur(in, out, 11, 1, 3), IEL_OK);
+  const int expect[11] = {0, 0, 4, 24, 60, 80, 60, 24, 4, 0, 0};
+  for (int x = 0; x < 11; ++x) EXPECT_EQ(chan(out[x], 0), expect[x]) << x;
+  EXPECT_EQ(static_cast<uint32_t>(out[5]) >> 24, 0x20u);
+  EXPECT_EQ(static_cast<uint32_t>(out[4]) >> 24, 0x10u);
+  // Radii above 300 blur as 300.
+  std::vector<int> pic = random_picture(23, 9, 5), a(pic.size()), b(pic.size());
+  ASSERT_EQ(variable_blur(pic, a, 23, 9, 300), IEL_OK);
+  ASSERT_EQ(variable_blur(pic, b, 23, 9, 5000), IEL_OK);
+  EXPECT_EQ(a, b);
+  // A picture of one constant channel per half keeps its extremes beyond
+  // the reach (radius 9: blocks of 2, at most 11 pixels).
+  std::vector<int> halves(40 * 3), blurred(halves.size());
+  for (int i = 0; i < 120; ++i) halves[i] = (i % 40) < 20 ? rgb(0, 10, 250) : rgb(255, 10, 0);
+  ASSERT_EQ(variable_blur(halves, blurred, 40, 3, 9), IEL_OK);
+  for (int i = 0; i < 120; ++i) EXPECT_EQ(chan(blurred[i], 1), 10);
+  for (int y = 0; y < 3; ++y) {
+    EXPECT_EQ(chan(blurred[y * 40 + 8], 0), 0);
+    EXPECT_EQ(chan(blurred[y * 40 + 31], 0), 255);
+    for (int x = 0; x + 1 < 40; ++x) EXPECT_LE(chan(blurred[y * 40 + x], 0), chan(blurred[y * 40 + x + 1], 0));
+  }
+}
+
+TEST(VariableBlur, ReducedBlocksAreRoundedMeans) {
+  // Radius 7 blurs blocks of 2 x 2. A picture whose blocks hold four values
+  // of one mean m blurs exactly like the picture filled with m in blocks:
+  // the reduction sees only the means.
+  const int w = 22, h = 14;
+  std::mt19937 rng(7);
+  std::vector<int> spread(w * h), flat(w * h), a(w * h), b(w * h);
+  for (int by = 0; by < h / 2; ++by) {
+    for (int bx = 0; bx < w / 2; ++bx) {
+      const int m = static_cast<int>(rng() % 200) + 20, d = static_cast<int>(rng() % 20);
+      const int vals[4] = {m - d, m + d, m + d, m - d};
+      for (int k = 0; k < 4; ++k) {
+        const int x = 2 * bx + k % 2, y = 2 * by + k / 2;
+        spread[y * w + x] = rgb(vals[k], m, vals[3 - k]);
+        flat[y * w + x] = rgb(m, m, m);
+      }
+    }
+  }
+  ASSERT_EQ(variable_blur(spread, a, w, h, 7), IEL_OK);
+  ASSERT_EQ(variable_blur(flat, b, w, h, 7), IEL_OK);
+  EXPECT_EQ(a, b);
 }
 
 TEST(VariableBlur, KeptOddities) {
@@ -415,15 +484,16 @@ TEST(VariableBlur, KeptOddities) {
   EXPECT_EQ(variable_blur(in, out, 4, 4, 7, IEL_FORMAT_RGB888), IEL_OK);
   EXPECT_TRUE(log.contains("Written for ARGB format only \n"));
   EXPECT_EQ(out, std::vector<int>(16, 0x1234));
-  // Working memory for 30 million rows exceeds one allocation: logged,
-  // success, nothing written (the picture itself is never reached).
-  structIELImage a{1, 30000000, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(in.data())};
-  structIELImage b{1, 30000000, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(out.data())};
-  int32_t level = 3;
-  structIELEffectParams p{IEL_EFFECT_VARIABLE_BLUR, &level, nullptr, 0, 0};
-  EXPECT_EQ(IEL_Apply_Effect(&a, &b, &p), IEL_OK);
+  // Working memory refused (at full size and reduced): logged, success,
+  // nothing written.
+  for (int radius : {3, 40}) {
+    px_mem_fail_nth(1);
+    EXPECT_EQ(variable_blur(in, out, 4, 4, radius), IEL_OK);
+    EXPECT_FALSE(px_mem_fail_pending());
+    px_mem_fail_nth(0);
+    EXPECT_EQ(out, std::vector<int>(16, 0x1234));
+  }
   EXPECT_TRUE(log.contains("Failed to allocate \n"));
-  EXPECT_EQ(out, std::vector<int>(16, 0x1234));
 }
 
 TEST(VariableBlur, OutfocusUsesTheRadiusTable) {
@@ -438,7 +508,7 @@ TEST(VariableBlur, OutfocusUsesTheRadiusTable) {
     structIELImage b{w, h, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(direct.data())};
     ASSERT_EQ(IEL_VariableBlur_ARGB8888(&a, &b, radius), IEL_OK);
     EXPECT_EQ(out, direct) << level;
-    EXPECT_EQ(chan(out[c + radius + 1], 0), 0) << level;
+    EXPECT_EQ(chan(out[c + radius + 3], 0), 0) << level;
     EXPECT_NE(chan(out[c + radius / 2], 0), 0) << level;
   }
 }

@@ -430,6 +430,32 @@ TEST(Sphericity, EnlargedRadiusReachesPastTheGivenOne) {
   EXPECT_EQ(dst[20 * 40 + 35], src[20 * 40 + 35]);  // distance 15
 }
 
+TEST(Sphericity, FastPathMatchesThePlainPath) {
+  const bool was = px_scalar_only();
+  // Odd sizes, a single row and column, centres at the borders, both
+  // directions of strength, half resolution and a rectangle cutting the circle.
+  struct Case {
+    int w, h, cx, cy, radius, strength, half;
+  };
+  for (const Case& c : {Case{37, 29, 18, 14, 20, 100, 0}, Case{37, 29, 0, 28, 30, 37, 1}, Case{1, 41, 0, 20, 15, 80, 0},
+                        Case{41, 1, 40, 0, 15, 55, 0}, Case{23, 31, 11, 9, 40, -100, 0}, Case{64, 48, 31, 23, 6, 1, 1}}) {
+    const std::vector<int> src = random_picture(c.w, c.h, c.w * 7 + c.strength);
+    std::vector<int> fast(src.size()), plain(src.size());
+    for (auto [left, right] : {std::pair{0, c.w - 1}, {c.w / 3, c.w - 2}}) {
+      px_set_scalar_only(false);
+      ASSERT_EQ(px_sphericity(src.data(), fast.data(), c.w, c.h, c.cx, c.cy, c.radius, c.strength, left, right, 0,
+                              c.h - 1, c.half),
+                PX_OK);
+      px_set_scalar_only(true);
+      ASSERT_EQ(px_sphericity(src.data(), plain.data(), c.w, c.h, c.cx, c.cy, c.radius, c.strength, left, right, 0,
+                              c.h - 1, c.half),
+                PX_OK);
+      EXPECT_EQ(fast, plain) << c.w << "x" << c.h << " strength " << c.strength << " left " << left;
+    }
+  }
+  px_set_scalar_only(was);
+}
+
 TEST(Sphericity, RefusesBadArguments) {
   const auto src = random_picture(6, 6, 17);
   std::vector<int> dst(src.size(), kSentinel);

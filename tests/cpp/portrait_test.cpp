@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <random>
 #include <string>
 #include <vector>
 
@@ -13,6 +14,7 @@
 #include "effect/portrait/px_beautifier.h"
 #include "effect/portrait/px_portrait.h"
 #include "effect/portrait/px_redeye.h"
+#include "effect/px_color/px_brush.h"
 
 namespace {
 
@@ -492,4 +494,176 @@ TEST(Outfocus, ComposeShiftsByEightAndMakesMixedPixelsOpaque) {
   EXPECT_EQ(out[0], argb(10, 20, 30, 0x20));
   EXPECT_EQ(out[1], argb(199, 99, 0));
   EXPECT_EQ(out[2], argb((128 * 10 + 127 * 200) >> 8, (128 * 20 + 127 * 100) >> 8, (128 * 30) >> 8));
+}
+
+// ---- previews that cost what they show -------------------------------------------------
+
+namespace {
+// The Q12 nearest-neighbour reduction of the previews, written out: the
+// preview pixels whose source lies outside the photo keep `fill`.
+std::vector<int> reduced(const std::vector<int>& full, int w, int h, int pw, int ph, int fill) {
+  const long long step = static_cast<long long>(static_cast<float>(static_cast<long long>(w) << 12) / static_cast<float>(pw));
+  std::vector<int> out(static_cast<size_t>(pw) * ph, fill);
+  for (int j = 0; j < ph; ++j)
+    for (int i = 0; i < pw; ++i) {
+      const long long sx = (i * step) >> 12, sy = (j * step) >> 12;
+      if (sx < w && sy < h) out[static_cast<size_t>(j) * pw + i] = full[static_cast<size_t>(sy) * w + sx];
+    }
+  return out;
+}
+
+// Seeded skin-toned noise: most pixels pass the skin test.
+std::vector<int> skin_noise(int w, int h, unsigned seed) {
+  std::vector<int> px(static_cast<size_t>(w) * h);
+  unsigned s = seed;
+  for (int& p : px) {
+    s = s * 1103515245u + 12345u;
+    const int d = static_cast<int>((s >> 16) % 41) - 20;
+    p = argb(200 + d / 2, 150 + d, 130 + d, 0x30 + static_cast<int>((s >> 8) & 0x3F));
+  }
+  return px;
+}
+}  // namespace
+
+// Preview sizes with awkward steps: halves, thirds, a preview wider than the
+// photo (repeated columns, rows past the photo), one row and one column.
+struct PreviewSize {
+  int pw, ph;
+};
+const PreviewSize kPreviewSizes[] = {{48, 40}, {33, 27}, {101, 70}, {137, 200}, {1, 97}, {97, 1}, {7, 5}};
+
+TEST(PreviewSampling, SampledBeautifierMatchesTheFullOneWithOverlappingFaces) {
+  const int w = 97, h = 83;
+  const std::vector<int> src = skin_noise(w, h, 7);
+  // Two overlapping boxes (the second samples pixels the first has changed)
+  // and one reaching past the right edge.
+  const caFaceBox faces[3] = {{20, 15, 30, 28}, {35, 30, 26, 30}, {80, 50, 25, 20}};
+  for (int level = 1; level <= 5; ++level) {
+    std::vector<int> full = src;
+    Face_BeautifierRGB(full.data(), h, w, level, faces, 3);
+    ASSERT_NE(full, src);
+    for (const PreviewSize& p : kPreviewSizes) {
+      // Columns and rows in any order of the photo, repeated ones too.
+      std::vector<int> xs, ys;
+      for (int i = 0; i < p.pw; ++i) xs.push_back(static_cast<int>((static_cast<long long>(i) * 7 + 3) % w));
+      for (int j = 0; j < p.ph; ++j) ys.push_back(static_cast<int>((static_cast<long long>(j) * 5 + 1) % h));
+      std::vector<int> out(static_cast<size_t>(p.pw + 2) * p.ph, 9);
+      ASSERT_TRUE(Face_BeautifierRGB_At(src.data(), h, w, level, faces, 3, xs.data(), p.pw, ys.data(), p.ph,
+                                        out.data(), p.pw + 2));
+      for (int j = 0; j < p.ph; ++j) {
+        for (int i = 0; i < p.pw; ++i)
+          ASSERT_EQ(out[static_cast<size_t>(j) * (p.pw + 2) + i], full[static_cast<size_t>(ys[j]) * w + xs[i]])
+              << "level " << level << " at " << xs[i] << "," << ys[j];
+        EXPECT_EQ(out[static_cast<size_t>(j) * (p.pw + 2) + p.pw], 9);  // the stride's gap stays
+      }
+    }
+  }
+  // Level 0 filters nothing: the samples are the photo's pixels.
+  const int xs[2] = {0, 96}, ys[2] = {82, 0};
+  int out[4] = {};
+  ASSERT_TRUE(Face_BeautifierRGB_At(src.data(), h, w, 0, faces, 3, xs, 2, ys, 2, out, 2));
+  EXPECT_EQ(out[0], src[82 * w]);
+  EXPECT_EQ(out[3], src[96]);
+}
+
+TEST(PreviewSampling, SampledBrushesMatchTheFullBrushes) {
+  const int w = 61, h = 45;
+  std::vector<int> src(static_cast<size_t>(w) * h);
+  std::mt19937 rng(3);
+  for (int& p : src) p = static_cast<int>(rng());
+  std::vector<int> xs, ys;
+  for (int i = 0; i < w; i += 2) xs.push_back(i);
+  for (int j = h - 1; j >= 0; j -= 3) ys.push_back(j);
+  const int nx = static_cast<int>(xs.size()), ny = static_cast<int>(ys.size());
+  struct Brush {
+    int cx, cy, strength, r;
+  };
+  // Centred, off the picture, beyond the 2048 lighten limit, one pixel.
+  for (const Brush& b : {Brush{30, 20, 45, 17}, Brush{-5, 50, 12, 30}, Brush{10, 10, 60, 3000}, Brush{4, 4, 90, 1}}) {
+    std::vector<int> lit = src, dark = src;
+    px_apply_lighten(lit.data(), b.cx, b.cy, w, h, b.strength, b.r);
+    px_apply_darken(dark.data(), b.cx, b.cy, w, h, b.strength, b.r);
+    std::vector<int> slit(static_cast<size_t>(nx) * ny), sdark;
+    for (int j = 0; j < ny; ++j)
+      for (int i = 0; i < nx; ++i) slit[static_cast<size_t>(j) * nx + i] = src[static_cast<size_t>(ys[j]) * w + xs[i]];
+    sdark = slit;
+    px_apply_lighten_at(slit.data(), nx, xs.data(), nx, ys.data(), ny, b.cx, b.cy, b.strength, b.r);
+    px_apply_darken_at(sdark.data(), nx, xs.data(), nx, ys.data(), ny, b.cx, b.cy, b.strength, b.r);
+    for (int j = 0; j < ny; ++j)
+      for (int i = 0; i < nx; ++i) {
+        ASSERT_EQ(slit[static_cast<size_t>(j) * nx + i], lit[static_cast<size_t>(ys[j]) * w + xs[i]]) << b.r;
+        ASSERT_EQ(sdark[static_cast<size_t>(j) * nx + i], dark[static_cast<size_t>(ys[j]) * w + xs[i]]) << b.r;
+      }
+  }
+}
+
+TEST(PreviewSampling, SessionPreviewsAreTheReducedFullResults) {
+  std::vector<int> src;
+  int w = 0, h = 0;
+  ASSERT_TRUE(astronaut(&src, &w, &h));
+  ASSERT_NE(px_init_portrait(5, 3, 1, src.data(), w, h), nullptr);
+  ASSERT_EQ(px_portrait_session()->faceCount, 1);
+  for (int level : {1, 4, 5}) {
+    std::vector<int> full(src.size());
+    ASSERT_EQ(px_apply_beautifier(src.data(), full.data(), w, h, level), 40960);
+    for (const PreviewSize& p : kPreviewSizes) {
+      std::vector<int> prev(static_cast<size_t>(p.pw) * p.ph, 3);
+      ASSERT_EQ(px_apply_beautifier_preview(src.data(), w, h, prev.data(), p.pw, p.ph, level), 40960);
+      EXPECT_EQ(prev, reduced(full, w, h, p.pw, p.ph, 3)) << p.pw << "x" << p.ph;
+      prev.assign(prev.size(), 3);
+      ASSERT_EQ(px_apply_beautifier_singleface_preview(src.data(), w, h, prev.data(), p.pw, p.ph, level, 0), 40960);
+      EXPECT_EQ(prev, reduced(full, w, h, p.pw, p.ph, 3));
+    }
+  }
+  for (int level : {0, 3, 17, 20}) {
+    std::vector<int> full(src.size());
+    ASSERT_EQ(px_control_light_in_portrait(src.data(), full.data(), w, h, level), 40960);
+    for (const PreviewSize& p : kPreviewSizes) {
+      std::vector<int> prev(static_cast<size_t>(p.pw) * p.ph, 3);
+      ASSERT_EQ(px_control_light_in_portrait_preview(src.data(), w, h, prev.data(), p.pw, p.ph, level), 40960);
+      EXPECT_EQ(prev, reduced(full, w, h, p.pw, p.ph, 3)) << level << " " << p.pw << "x" << p.ph;
+      prev.assign(prev.size(), 3);
+      ASSERT_EQ(px_control_light_in_portrait_singleface_preview(src.data(), w, h, prev.data(), p.pw, p.ph, level, 2),
+                40960);
+      EXPECT_EQ(prev, reduced(src, w, h, p.pw, p.ph, 3));  // no such face: the plain reduction
+    }
+  }
+  px_finish_portrait();
+  px_set_facebeauty(2, 3, 3);
+}
+
+TEST(PreviewSampling, OutfocusPreviewBlursTheReducedPhoto) {
+  std::vector<int> src;
+  int w = 0, h = 0;
+  ASSERT_TRUE(astronaut(&src, &w, &h));
+  ASSERT_NE(px_init_portrait(5, 3, 1, src.data(), w, h), nullptr);
+  const caFaceBox face = px_portrait_session()->faceRect[0];
+  // A quarter of the photo's side (step 4.0): the blur radius 31 of strength
+  // 3 becomes 8 (rounded); the faces shrink by 4 as well.
+  ASSERT_EQ(w % 4, 0);
+  const int pw = w / 4, ph = h / 4 + 3;
+  std::vector<int> prev(static_cast<size_t>(pw) * ph, 6);
+  ASSERT_EQ(px_control_outfocusing_in_portrait_preview(src.data(), w, h, prev.data(), pw, ph, 3), 40960);
+  std::vector<int> small = reduced(src, w, h, pw, ph, 6);
+  const int nx = pw, ny = h / 4;
+  for (int j = ny; j < ph; ++j)  // rows without a source stay
+    for (int i = 0; i < pw; ++i) ASSERT_EQ(prev[static_cast<size_t>(j) * pw + i], 6);
+  std::vector<int> blurred(static_cast<size_t>(nx) * ny), compact(blurred.size());
+  for (int j = 0; j < ny; ++j)
+    for (int i = 0; i < nx; ++i) compact[static_cast<size_t>(j) * nx + i] = small[static_cast<size_t>(j) * pw + i];
+  ASSERT_EQ(px_blur_variable(compact.data(), blurred.data(), nx, ny, 8), 0);
+  // The face centre is sharp (weight 0, the >> 8 of the mix), the top corners
+  // (far from the face and the body below it) fully blurred.
+  const int cx = (face.x + face.width / 2) / 4, cy = (face.y + face.height / 2) / 4;
+  const int c = compact[static_cast<size_t>(cy) * nx + cx];
+  int sharp = static_cast<int>(0xFF000000u);
+  for (int shift = 0; shift <= 16; shift += 8) sharp |= ((((c >> shift) & 0xFF) * 255) >> 8) << shift;
+  EXPECT_EQ(prev[static_cast<size_t>(cy) * pw + cx], sharp);
+  EXPECT_EQ(prev[0], blurred[0]);
+  EXPECT_EQ(prev[static_cast<size_t>(nx - 1)], blurred[static_cast<size_t>(nx - 1)]);
+  // Strength 0 still blurs the preview a little (radius 3 -> 1); a negative
+  // strength is refused.
+  EXPECT_EQ(px_control_outfocusing_in_portrait_preview(src.data(), w, h, prev.data(), pw, ph, -2), 40971);
+  px_finish_portrait();
+  px_set_facebeauty(2, 3, 3);
 }

@@ -3,6 +3,7 @@
 #include "../px_math.h"
 #include "px_blur.h"
 
+#include <atomic>
 #include <cstdint>
 #include <cstring>
 
@@ -239,9 +240,94 @@ bool make_tiltshift(const unsigned char* src, unsigned char* dst, int w, int h) 
   return separable_blur<false>(src, dst, nullptr, w, h, Taps{-4, 5});
 }
 
-void run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
+namespace {
+// The compositing of run_blur, sped up: the column samples are taken once
+// for the whole picture, and each output row first blends its two reduced
+// rows vertically, v = p_top * (32 - fy) + p_bottom * fy, kept unshifted;
+// a pixel whose four reduced neighbours are all selected is then
+// (v0 * (32 - fx) + v1 * fx) >> 10, the same integer as the plain bilinear
+// sum. Pixels with an unselected neighbour take the plain per-channel form.
+// False when the working memory cannot be had.
+bool run_blur_rows(const int* src, const unsigned char* blurred, const unsigned char* mask,
+                   const unsigned char* reducedMask, int* dst, int width, int height, int w, int h) {
+  const int64_t stepY = step_of(h, height);
+  const int64_t stepX = step_of(w, width);
+  const int64_t bits = index_bits(width, height);
+  const bool whole = all != 0;
+  constexpr int kMinRows = 64;
+  const int bands = px_band_count(height, kMinRows);
+  // Per band: the blended reduced row (3 ints a reduced pixel) and its
+  // "both rows selected" flags.
+  // (Rounded up to 16 bytes, so that every band's ints are aligned.)
+  const size_t per_band = (static_cast<size_t>(w) * 3 * sizeof(int32_t) + static_cast<size_t>(w) + 15) & ~size_t{15};
+  auto* cols = static_cast<Sample*>(px_malloc(static_cast<size_t>(width), sizeof(Sample)));
+  auto* work = static_cast<unsigned char*>(px_malloc(per_band, static_cast<size_t>(bands)));
+  if (!cols || !work) {
+    px_free(cols);
+    px_free(work);
+    return false;
+  }
+  for (int x = 0; x < width; ++x) cols[x] = sample(x, stepX, w, bits);
+  std::atomic<int> next{0};
+  px_for_rows(
+      height,
+      [&](int y0, int y1) {
+        unsigned char* mine = work + per_band * static_cast<size_t>(next.fetch_add(1));
+        auto* v = reinterpret_cast<int32_t*>(mine);
+        unsigned char* both = mine + static_cast<size_t>(w) * 3 * sizeof(int32_t);
+        for (int y = y0; y < y1; ++y) {
+          const Sample sy = sample(y, stepY, h, bits);
+          const size_t top = area(w, sy.i0), bottom = area(w, sy.i1);
+          const int wy0 = 32 - sy.f, wy1 = sy.f;
+          for (int j = 0; j < w; ++j) {
+            const unsigned char* pt = blurred + (top + j) * 3;
+            const unsigned char* pb = blurred + (bottom + j) * 3;
+            for (int c = 0; c < 3; ++c) v[3 * j + c] = pt[c] * wy0 + pb[c] * wy1;
+            both[j] = reducedMask[top + j] == 1 && reducedMask[bottom + j] == 1;
+          }
+          const size_t row = area(width, y);
+          for (int x = 0; x < width; ++x) {
+            const size_t i = row + x;
+            const auto s = static_cast<uint32_t>(src[i]);
+            if (!whole && mask && mask[i] != 1) {
+              dst[i] = src[i];
+              continue;
+            }
+            const Sample sx = cols[x];
+            const int wx0 = 32 - sx.f, wx1 = sx.f;
+            uint32_t out = s & 0xFF000000u;
+            if (both[sx.i0] && both[sx.i1]) {
+              const int32_t* a = v + 3 * sx.i0;
+              const int32_t* b = v + 3 * sx.i1;
+              for (int c = 0; c < 3; ++c)
+                out |= static_cast<uint32_t>((a[c] * wx0 + b[c] * wx1) >> 10) << (16 - 8 * c);
+            } else {
+              const size_t corner[4] = {top + sx.i0, top + sx.i1, bottom + sx.i0, bottom + sx.i1};
+              for (int c = 0; c < 3; ++c) {
+                const int own = static_cast<int>((s >> (16 - 8 * c)) & 255);
+                int p[4];
+                for (int k = 0; k < 4; ++k) p[k] = reducedMask[corner[k]] == 1 ? blurred[corner[k] * 3 + c] : own;
+                const int t = p[0] * wx0 + p[1] * wx1, bt = p[2] * wx0 + p[3] * wx1;
+                out |= static_cast<uint32_t>((t * wy0 + bt * wy1) >> 10) << (16 - 8 * c);
+              }
+            }
+            dst[i] = static_cast<int>(out);
+          }
+        }
+      },
+      kMinRows);
+  px_free(work);
+  px_free(cols);
+  return true;
+}
+}  // namespace
+
+bool run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
               const unsigned char* reducedMask, int* dst, int width, int height, int w, int h) {
-  if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
+  if (!src || !blurred || !reducedMask || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return true;
+  // The fast form without its working memory writes nothing: the caller
+  // reports the shortage.
+  if (!px_scalar_only()) return run_blur_rows(src, blurred, mask, reducedMask, dst, width, height, w, h);
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
   const int64_t bits = index_bits(width, height);
@@ -274,11 +360,99 @@ void run_blur(const int* src, const unsigned char* blurred, const unsigned char*
       }
     }
   });
+  return true;
 }
 
-void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+namespace {
+// restore_tiltshift with the rows blended first, as run_blur_rows (a = the
+// row's sharpness weight). False when the working memory cannot be had.
+constexpr int kTiltRows = 64;  // rows per band of the tilt-shift restore
+
+// The working memory of restore_tiltshift_rows, taken before anything is
+// written where a caller needs that.
+struct TiltMemory {
+  Sample* cols = nullptr;
+  unsigned char* work = nullptr;
+  bool take(int width, int height, int w) {
+    cols = static_cast<Sample*>(px_malloc(static_cast<size_t>(width), sizeof(Sample)));
+    work = static_cast<unsigned char*>(
+        px_malloc(static_cast<size_t>(w) * 3 * sizeof(int32_t), static_cast<size_t>(px_band_count(height, kTiltRows))));
+    if (cols && work) return true;
+    release();
+    return false;
+  }
+  void release() {
+    px_free(cols);
+    px_free(work);
+    cols = nullptr;
+    work = nullptr;
+  }
+};
+
+bool restore_tiltshift_rows(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w,
+                            int h, int64_t d, int64_t k, int center, int halfBand, const TiltMemory& memory) {
+  const int64_t stepY = step_of(h, height);
+  const int64_t stepX = step_of(w, width);
+  const int64_t bits = index_bits(width, height);
+  constexpr int kMinRows = kTiltRows;
+  const size_t per_band = static_cast<size_t>(w) * 3 * sizeof(int32_t);
+  Sample* cols = memory.cols;
+  unsigned char* work = memory.work;
+  for (int x = 0; x < width; ++x) cols[x] = sample(x, stepX, w, bits);
+  std::atomic<int> next{0};
+  px_for_rows(
+      height,
+      [&](int y0, int y1) {
+        auto* v = reinterpret_cast<int32_t*>(work + per_band * static_cast<size_t>(next.fetch_add(1)));
+        for (int y = y0; y < y1; ++y) {
+          int64_t beyond =
+              (y > center ? static_cast<int64_t>(y) - center : static_cast<int64_t>(center) - y) - halfBand;
+          if (beyond < 0) beyond = 0;
+          int64_t a64 = ((d - beyond) * k) >> 20;
+          const int a = a64 < 0 ? 0 : static_cast<int>(a64);
+          const Sample sy = sample(y, stepY, h, bits);
+          const unsigned char* pt = blurred + area(w, sy.i0) * 3;
+          const unsigned char* pb = blurred + area(w, sy.i1) * 3;
+          const int wy0 = 32 - sy.f, wy1 = sy.f;
+          for (int j = 0; j < 3 * w; ++j) v[j] = pt[j] * wy0 + pb[j] * wy1;
+          const size_t row = area(width, y);
+          for (int x = 0; x < width; ++x) {
+            const size_t i = row + x;
+            const auto s = static_cast<uint32_t>(src[i]);
+            const Sample sx = cols[x];
+            const int32_t* p0 = v + 3 * sx.i0;
+            const int32_t* p1 = v + 3 * sx.i1;
+            const int wx0 = 32 - sx.f, wx1 = sx.f;
+            uint32_t out = s & 0xFF000000u;
+            for (int c = 0; c < 3; ++c) {
+              int b = (p0[c] * wx0 + p1[c] * wx1) >> 10;
+              if (b > 255) b = 255;
+              const int own = static_cast<int>((s >> (16 - 8 * c)) & 255);
+              out |= static_cast<uint32_t>(px_clamp255((b * (256 - a) + own * a) >> 8)) << (16 - 8 * c);
+            }
+            dst[i] = static_cast<int>(out);
+          }
+        }
+      },
+      kMinRows);
+  return true;
+}
+
+bool restore_tiltshift_with(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w,
+                            int h, int center, int halfBand, const TiltMemory* held);
+}  // namespace
+
+bool restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
                        int center, int halfBand) {
-  if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return;
+  return restore_tiltshift_with(src, blurred, dst, width, height, w, h, center, halfBand, nullptr);
+}
+
+namespace {
+// restore_tiltshift with the fast form's memory already held (or taken here
+// when `held` is null); false, with nothing written, when it cannot be had.
+bool restore_tiltshift_with(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+                            int center, int halfBand, const TiltMemory* held) {
+  if (!src || !blurred || !dst || width <= 0 || height <= 0 || w <= 0 || h <= 0) return true;
   const int64_t stepY = step_of(h, height);
   const int64_t stepX = step_of(w, width);
   const int64_t bits = index_bits(width, height);
@@ -290,6 +464,14 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
                   : (static_cast<int64_t>(height) - center - halfBand) >> 1;
   if (d < 1) d = 1;
   const int64_t k = d > 0x100000 ? 0 : (0x100000 / d) * 256;
+  if (!px_scalar_only()) {
+    if (held) return restore_tiltshift_rows(src, blurred, dst, width, height, w, h, d, k, center, halfBand, *held);
+    TiltMemory memory;
+    if (!memory.take(width, height, w)) return false;
+    restore_tiltshift_rows(src, blurred, dst, width, height, w, h, d, k, center, halfBand, memory);
+    memory.release();
+    return true;
+  }
   px_for_rows(height, [&](int y0, int y1) {
     for (int y = y0; y < y1; ++y) {
       int64_t beyond = (y > center ? static_cast<int64_t>(y) - center : static_cast<int64_t>(center) - y) - halfBand;
@@ -319,7 +501,9 @@ void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, i
       }
     }
   });
+  return true;
 }
+}  // namespace
 
 // ---- selective blur -----------------------------------------------------------
 
@@ -344,7 +528,7 @@ int px_Init_blur(const int* src, unsigned char* mask, int width, int height, int
 void px_make_blur_preview(const int* src, const unsigned char* mask, int* dst, int width, int height, int level) {
   if (!g_ssrc || !g_tempd || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
   if (!make_gaussian_blur(g_ssrc, g_sblur, g_tempd, g_scaled_wd, g_scaled_ht, level)) return;
-  run_blur(src, g_sblur, mask, g_tempd, dst, width, height, g_scaled_wd, g_scaled_ht);
+  run_blur(src, g_sblur, mask, g_tempd, dst, width, height, g_scaled_wd, g_scaled_ht);  // short of memory: dst as it was
 }
 
 int px_make_blur(const int* src, unsigned char* mask, int* dst, int width, int height, int level, int left,
@@ -358,8 +542,7 @@ int px_make_blur(const int* src, unsigned char* mask, int* dst, int width, int h
   scale_down_depth(mask, width, height, r.mask, r.w, r.h);
   int rc = PX_ERR_ALLOC;
   if (make_gaussian_blur(r.pic, r.blurred, r.mask, r.w, r.h, level)) {
-    run_blur(src, r.blurred, mask, r.mask, dst, width, height, r.w, r.h);
-    rc = PX_OK;
+    if (run_blur(src, r.blurred, mask, r.mask, dst, width, height, r.w, r.h)) rc = PX_OK;
   }
   r.release();
   if (whole && mask) std::memset(mask, 0, area(width, height));
@@ -392,7 +575,7 @@ int px_init_tiltshift(const int* src, int width, int height) {
 void px_tiltshift_preview(const int* src, int* dst, int width, int height, int center, int halfBand) {
   if (!g_ssrc || !g_sblur || !src || !dst || width <= 0 || height <= 0) return;
   if (!make_tiltshift(g_ssrc, g_sblur, g_scaled_wd, g_scaled_ht)) return;
-  restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);
+  restore_tiltshift(src, g_sblur, dst, width, height, g_scaled_wd, g_scaled_ht, center, halfBand);  // short of memory: dst as it was
 }
 
 namespace {
@@ -405,7 +588,9 @@ int tiltshift(const int* src, int* dst, int width, int height, int center, int h
   Reduced r;
   if (!allocate(r, width, height, false)) return PX_ERR_ALLOC;
   auto* scratch = static_cast<unsigned char*>(px_malloc(area(r.w, r.h), 3));
-  if (!scratch) {
+  TiltMemory rows;
+  if (!scratch || (!px_scalar_only() && !rows.take(width, height, r.w))) {
+    px_free(scratch);
     r.release();
     return PX_ERR_ALLOC;
   }
@@ -415,7 +600,9 @@ int tiltshift(const int* src, int* dst, int width, int height, int center, int h
   px_free(scratch);
   px_free(r.pic);
   r.pic = nullptr;
-  restore_tiltshift(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand);
+  restore_tiltshift_with(src, r.blurred, dst, width, height, r.w, r.h, center, halfBand,
+                         px_scalar_only() ? nullptr : &rows);
+  rows.release();
   r.release();
   return PX_OK;
 }
@@ -439,8 +626,13 @@ void px_destroy_tiltshift() {
 
 // ---- out-focus ---------------------------------------------------------------------
 
+int px_blur_outfocus_radius(int level) { return kOutfocusRadius[level < 0 ? 0 : (level > 7 ? 7 : level)]; }
+
 int px_blur_outfocus(int* src, int* dst, int width, int height, int level) {
-  int radius = kOutfocusRadius[level < 0 ? 0 : (level > 7 ? 7 : level)];
+  return px_blur_variable(src, dst, width, height, px_blur_outfocus_radius(level));
+}
+
+int px_blur_variable(int* src, int* dst, int width, int height, int radius) {
   structIELImage in{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(src)};
   structIELImage out{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(dst)};
   structIELEffectParams params{IEL_EFFECT_VARIABLE_BLUR, &radius, nullptr, 0, 0};

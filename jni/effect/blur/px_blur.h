@@ -70,6 +70,10 @@ void px_destroy_tiltshift();
 // radius 3, 7, 15, 31, 41, 49, 55, 63 of level 0..7 (levels above 7 use 63,
 // negative levels 3). Returns the effect library's result code.
 int px_blur_outfocus(int* src, int* dst, int width, int height, int level);
+// The radius of an out-focus level, and the variable blur at any radius
+// (through the effect library, as px_blur_outfocus).
+int px_blur_outfocus_radius(int level);
+int px_blur_variable(int* src, int* dst, int width, int height, int radius);
 
 // ---- steps, exposed for the tests --------------------------------------------
 
@@ -99,11 +103,13 @@ bool make_gaussian_blur(const unsigned char* src, unsigned char* dst, const unsi
 // Unmasked separable blur with taps -4..4. False on allocation failure.
 bool make_tiltshift(const unsigned char* src, unsigned char* dst, int w, int h);
 
-// Selective-blur compositing of the blurred reduced picture into dst.
-void run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
+// Selective-blur compositing of the blurred reduced picture into dst. False,
+// with dst untouched, when the working memory cannot be had.
+bool run_blur(const int* src, const unsigned char* blurred, const unsigned char* mask,
               const unsigned char* reducedMask, int* dst, int width, int height, int w, int h);
-// Tilt-shift restore of the blurred reduced picture into dst.
-void restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
+// Tilt-shift restore of the blurred reduced picture into dst. False, with dst
+// untouched, when the working memory cannot be had.
+bool restore_tiltshift(const int* src, const unsigned char* blurred, int* dst, int width, int height, int w, int h,
                        int center, int halfBand);
 
 // The "whole picture" flag of the last selective-blur initialisation.

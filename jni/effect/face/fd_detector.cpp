@@ -395,42 +395,63 @@ void fd_scan_band_enrolling(const FdLevel& L, const FdScanBand& band) {
     fd_scan_row(L.mct, L.w, 2 * row, offset, [&](int x, int sum) { fd_enroll_hit(x, 2 * row, L.scale, sum); });
 }
 
-// False when the buffers cannot be had (the caller then takes the plain pass).
-bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, int r, int levels) {
+// One picture's threaded pass: its levels, buffers and scan bands.
+struct FdPlan {
+  const unsigned char* grey;
+  int width, height;
   FdLevel level[kFdMaxLevels];
-  int n = 0, codeBands = 0, scanBands = 0;
+  int n, codeBands, scanBands;
+  unsigned char* greys;
+  unsigned short* codes;
+  FdScanBand* bands;
+};
+
+void fd_plan_free(FdPlan* P) {
+  px_free(P->greys);
+  px_free(P->codes);
+  px_free(P->bands);
+  P->greys = nullptr;
+  P->codes = nullptr;
+  P->bands = nullptr;
+}
+
+// Lays out the levels and takes their buffers; false (nothing kept) when
+// the buffers cannot be had.
+bool fd_plan(FdPlan* P, const unsigned char* grey, int width, int height, int r, int levels) {
+  *P = FdPlan{};
+  P->grey = grey;
+  P->width = width;
+  P->height = height;
   size_t greyTotal = 0, codeTotal = 0;
   int lw, lh;
   for (int k = 0; k < levels && k < kFdMaxLevels && fd_level_size(k, width, height, r, &lw, &lh); ++k) {
-    FdLevel& L = level[n++];
+    FdLevel& L = P->level[P->n++];
     L = FdLevel{lw, lh, static_cast<int>((static_cast<int64_t>(width) << 15) / lw), grey, nullptr, nullptr,
-                codeBands, scanBands};
+                P->codeBands, P->scanBands};
     const size_t size = static_cast<size_t>(lw) * lh;
     if (lw != width || lh != height) greyTotal += size;
     codeTotal += size;
-    codeBands += (lh + kFdCodeRows - 1) / kFdCodeRows;
-    scanBands += (fd_window_rows(L) + kFdScanRows - 1) / kFdScanRows;
+    P->codeBands += (lh + kFdCodeRows - 1) / kFdCodeRows;
+    P->scanBands += (fd_window_rows(L) + kFdScanRows - 1) / kFdScanRows;
   }
-  if (n == 0) return true;
-  auto* greys = static_cast<unsigned char*>(px_malloc(greyTotal > 0 ? greyTotal : 1, 1));
-  auto* codes = static_cast<unsigned short*>(px_malloc(codeTotal, sizeof(unsigned short)));
-  auto* bands = static_cast<FdScanBand*>(px_malloc(scanBands > 0 ? scanBands : 1, sizeof(FdScanBand)));
-  if (!greys || !codes || !bands) {
-    px_free(greys);
-    px_free(codes);
-    px_free(bands);
+  if (P->n == 0) return true;
+  P->greys = static_cast<unsigned char*>(px_malloc(greyTotal > 0 ? greyTotal : 1, 1));
+  P->codes = static_cast<unsigned short*>(px_malloc(codeTotal, sizeof(unsigned short)));
+  P->bands = static_cast<FdScanBand*>(px_malloc(P->scanBands > 0 ? P->scanBands : 1, sizeof(FdScanBand)));
+  if (!P->greys || !P->codes || !P->bands) {
+    fd_plan_free(P);
     return false;
   }
   size_t greyAt = 0, codeAt = 0;
-  for (int k = 0; k < n; ++k) {
-    FdLevel& L = level[k];
+  for (int k = 0; k < P->n; ++k) {
+    FdLevel& L = P->level[k];
     const size_t size = static_cast<size_t>(L.w) * L.h;
     if (L.w != width || L.h != height) {
-      L.own = greys + greyAt;
+      L.own = P->greys + greyAt;
       L.grey = L.own;
       greyAt += size;
     }
-    L.mct = codes + codeAt;
+    L.mct = P->codes + codeAt;
     codeAt += size;
     // The codes the census walk leaves out (the first row and the first code
     // of the second, the last row and the last code before it) are zero, as
@@ -439,35 +460,117 @@ bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, i
     std::memset(L.mct + size - L.w - 1, 0, (static_cast<size_t>(L.w) + 1) * sizeof(unsigned short));
     const int rows = fd_window_rows(L);
     for (int row = 0, b = L.scanBand0; row < rows; row += kFdScanRows, ++b) {
-      bands[b].level = k;
-      bands[b].row0 = row;
-      bands[b].row1 = row + kFdScanRows < rows ? row + kFdScanRows : rows;
+      P->bands[b].level = k;
+      P->bands[b].row0 = row;
+      P->bands[b].row1 = row + kFdScanRows < rows ? row + kFdScanRows : rows;
     }
   }
-  fd_run_tasks(n, [&](int k) {
-    if (level[k].own) Resize_NN(grey, width, height, level[k].own, level[k].w, level[k].h);
+  return true;
+}
+
+// The plans' resampling, census codes and scans, all of one kind at once
+// over the worker threads (the tasks of every plan in one pool, so several
+// pictures keep both cores busy where one alone leaves gaps).
+void fd_run_plans(FdPlan* plans, int count) {
+  int levels[4] = {}, codes[4] = {}, scans[4] = {};  // task counts before plan p
+  for (int p = 0; p < count; ++p) {
+    levels[p + 1] = levels[p] + plans[p].n;
+    codes[p + 1] = codes[p] + plans[p].codeBands;
+    scans[p + 1] = scans[p] + plans[p].scanBands;
+  }
+  auto plan_of = [&](const int* first, int task) {
+    int p = 0;
+    while (p + 1 < count && task >= first[p + 1]) ++p;
+    return p;
+  };
+  fd_run_tasks(levels[count], [&](int t) {
+    FdPlan& P = plans[plan_of(levels, t)];
+    const FdLevel& L = P.level[t - levels[&P - plans]];
+    if (L.own) Resize_NN(P.grey, P.width, P.height, L.own, L.w, L.h);
   });
-  fd_run_tasks(codeBands, [&](int b) {
-    const FdLevel& L = level[fd_band_level(level, n, b, false)];
+  fd_run_tasks(codes[count], [&](int t) {
+    FdPlan& P = plans[plan_of(codes, t)];
+    const int b = t - codes[&P - plans];
+    const FdLevel& L = P.level[fd_band_level(P.level, P.n, b, false)];
     const int row0 = (b - L.codeBand0) * kFdCodeRows;
     image2MCT_FD_rows(L.grey, L.w, L.h, row0, row0 + kFdCodeRows < L.h ? row0 + kFdCodeRows : L.h, L.mct);
   });
-  fd_run_tasks(scanBands, [&](int b) { fd_scan_band(level[bands[b].level], &bands[b]); });
-  for (int b = 0; b < scanBands; ++b) {
-    const FdLevel& L = level[bands[b].level];
-    if (bands[b].full) {
-      fd_scan_band_enrolling(L, bands[b]);
+  fd_run_tasks(scans[count], [&](int t) {
+    FdPlan& P = plans[plan_of(scans, t)];
+    const int b = t - scans[&P - plans];
+    fd_scan_band(P.level[P.bands[b].level], &P.bands[b]);
+  });
+}
+
+// Enrols a plan's hits on the calling thread in the plain scan's order.
+void fd_enrol_plan(const FdPlan& P) {
+  for (int b = 0; b < P.scanBands; ++b) {
+    const FdLevel& L = P.level[P.bands[b].level];
+    if (P.bands[b].full) {
+      fd_scan_band_enrolling(L, P.bands[b]);
       continue;
     }
-    for (int i = 0; i < bands[b].hits; ++i) {
-      const FdHit& hit = bands[b].hit[i];
+    for (int i = 0; i < P.bands[b].hits; ++i) {
+      const FdHit& hit = P.bands[b].hit[i];
       fd_enroll_hit(hit.x, hit.y, L.scale, hit.sum);
     }
   }
-  px_free(greys);
-  px_free(codes);
-  px_free(bands);
+}
+
+// False when the buffers cannot be had (the caller then takes the plain pass).
+bool fd_scan_levels_threaded(const unsigned char* grey, int width, int height, int r, int levels) {
+  FdPlan plan;
+  if (!fd_plan(&plan, grey, width, height, r, levels)) return false;
+  fd_run_plans(&plan, 1);
+  fd_enrol_plan(plan);
+  fd_plan_free(&plan);
   return true;
+}
+
+// The picture's r (shorter over longer side, Q15).
+int fd_ratio(int width, int height) {
+  const int longer = width > height ? width : height, shorter = width > height ? height : width;
+  return static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
+}
+
+// A pass's candidates that stand become faces (turned back for the turned
+// passes).
+void fd_keep_candidates(int width, int height, int rotated, int angle) {
+  for (int i = 0; i < m_nFaceCandidateCountFrontal; ++i) {
+    if (!m_bFaceCandidateValidFrontal[i] || m_nFaceCandidateIntersectionCountFrontal[i] < 3) continue;
+    SMyRect2 box = m_rcFaceCandidateFrontal[i];
+    if (rotated) box = InvRotate(box, width, height, angle);
+    fd_add_face(box, m_nFaceCandidateConfidenceFrontal[i], rotated ? angle : 0);
+  }
+}
+
+// The upright and the two turned passes scanned together: their tasks share
+// the workers, then each pass enrols its hits and keeps its faces in the
+// order of the passes one after the other. False (nothing done) when the
+// buffers cannot be had.
+bool fd_three_passes(const unsigned char* grey, int width, int height, int precision) {
+  const size_t n = static_cast<size_t>(width) * height;
+  auto* turned = static_cast<unsigned char*>(px_malloc(n, 2));
+  if (!turned) return false;
+  Rotate(grey, turned, width, height, 45);
+  Rotate(grey, turned + n, width, height, -45);
+  const int r = fd_ratio(width, height), levels = fd_pyramid_count(precision);
+  FdPlan plans[3];
+  const unsigned char* pictures[3] = {grey, turned, turned + n};
+  int planned = 0;
+  while (planned < 3 && fd_plan(&plans[planned], pictures[planned], width, height, r, levels)) ++planned;
+  if (planned == 3) {
+    fd_run_plans(plans, 3);
+    static const int kAngle[3] = {0, 45, -45};
+    for (int p = 0; p < 3; ++p) {
+      fd_reset_candidates();
+      fd_enrol_plan(plans[p]);
+      fd_keep_candidates(width, height, p > 0, kAngle[p]);
+    }
+  }
+  for (int p = 0; p < planned; ++p) fd_plan_free(&plans[p]);
+  px_free(turned);
+  return planned == 3;
 }
 }  // namespace
 
@@ -476,17 +579,11 @@ int fd_find_run(const unsigned char* grey, int width, int height, int unusedFlag
   (void)unusedFlag;
   fd_reset_candidates();
   if (!grey || width < 1 || height < 1) return m_nFaceCount;
-  const int longer = width > height ? width : height, shorter = width > height ? height : width;
-  const int r = static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
+  const int r = fd_ratio(width, height);
   const int levels = fd_pyramid_count(precision);
   if (px_scalar_only() || !fd_scan_levels_threaded(grey, width, height, r, levels))
     fd_scan_levels_plain(grey, width, height, r, levels);
-  for (int i = 0; i < m_nFaceCandidateCountFrontal; ++i) {
-    if (!m_bFaceCandidateValidFrontal[i] || m_nFaceCandidateIntersectionCountFrontal[i] < 3) continue;
-    SMyRect2 box = m_rcFaceCandidateFrontal[i];
-    if (rotated) box = InvRotate(box, width, height, angle);
-    fd_add_face(box, m_nFaceCandidateConfidenceFrontal[i], rotated ? angle : 0);
-  }
+  fd_keep_candidates(width, height, rotated, angle);
   return m_nFaceCount;
 }
 
@@ -505,8 +602,10 @@ void fd_final() {
 
 int fd_find(const unsigned char* grey, int width, int height, int rotatedPasses, int unusedFlag, int precision) {
   fd_reset_faces();
-  fd_find_run(grey, width, height, unusedFlag, 0, 0, precision);
-  if (rotatedPasses && grey && width > 0 && height > 0) {
+  const bool together = rotatedPasses && grey && width > 0 && height > 0 && !px_scalar_only() &&
+                        fd_three_passes(grey, width, height, precision);
+  if (!together) fd_find_run(grey, width, height, unusedFlag, 0, 0, precision);
+  if (!together && rotatedPasses && grey && width > 0 && height > 0) {
     auto* turned = static_cast<unsigned char*>(px_malloc(static_cast<size_t>(width) * height, 1));
     if (turned) {
       Rotate(grey, turned, width, height, 45);

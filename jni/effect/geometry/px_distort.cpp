@@ -19,9 +19,24 @@ void copy_row(int* dst, const int* src, int count) {
 
 int clamp(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
+// Bilinear_Fixed's arithmetic, inlined into the samplers.
+inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
+                         uint32_t bottomRight) {
+  uint32_t result = 0xFF000000u;
+  for (int shift = 16; shift >= 0; shift -= 8) {
+    const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
+    const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
+    const int top = tr * fx + tl * (2048 - fx);
+    const int bottom = br * fx + bl * (2048 - fx);
+    const int value = ((2048 - fy) * top + fy * bottom) >> 22;
+    result |= static_cast<uint32_t>(value & 255) << shift;
+  }
+  return result;
+}
+
 // The pixel at a sub-pixel position (xi + fx / 2048, yi + fy / 2048), its
 // four neighbours clamped to the picture near the border.
-uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, int fy) {
+inline uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, int fy) {
   int x0 = xi, x1 = xi + 1, y0 = yi, y1 = yi + 1;
   if (!(xi >= 0 && xi < width - 1 && yi >= 0 && yi < height - 1)) {
     x0 = clamp(x0, 0, width - 1);
@@ -30,9 +45,7 @@ uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, i
     y1 = clamp(y1, 0, height - 1);
   }
   const auto* s = reinterpret_cast<const uint32_t*>(src);
-  uint32_t out;
-  return Bilinear_Fixed(fx, fy, s[at(x0, y0, width)], s[at(x1, y0, width)], s[at(x0, y1, width)],
-                        s[at(x1, y1, width)], &out);
+  return bilinear(fx, fy, s[at(x0, y0, width)], s[at(x1, y0, width)], s[at(x0, y1, width)], s[at(x1, y1, width)]);
 }
 
 // Writes an interpolated colour at (x, y) with that pixel's alpha; in half
@@ -108,6 +121,26 @@ Axis twirl_offset(int center, int D, int trig) {
   const int f = F & 0x1FFFFFF;
   if (trig >= 0) return {center + n, f >> 14};
   return {center - 1 - n, (0x2000000 - f) >> 14};
+}
+
+// Exact truncating division of a 32-bit int by a divisor of at least 2 known
+// in advance: |n| * m >> 64 with m = floor(2^64 / d) + 1 is floor(|n| / d)
+// for every |n| < 2^32 (the error stays below 1 / d), so the fast path
+// divides without a divide instruction.
+struct Divisor {
+  uint32_t m_hi, m_lo;
+};
+Divisor divisor_of(uint32_t d) {
+  // floor(2^64 / d) + 1; for a power of 2 this gives 2^64 / d itself, which
+  // divides exactly too.
+  const uint64_t m = (~uint64_t{0}) / d + 1;
+  return {static_cast<uint32_t>(m >> 32), static_cast<uint32_t>(m)};
+}
+inline int divide(int n, Divisor d) {
+  const uint32_t a = n < 0 ? 0u - static_cast<uint32_t>(n) : static_cast<uint32_t>(n);
+  const uint64_t hi = static_cast<uint64_t>(a) * d.m_hi + ((static_cast<uint64_t>(a) * d.m_lo) >> 32);
+  const uint32_t q = static_cast<uint32_t>(hi >> 32);
+  return n < 0 ? -static_cast<int>(q) : static_cast<int>(q);
 }
 
 // Magnitude product with the sign of d restored.
@@ -197,17 +230,8 @@ int FATAN2(int x, int y) {
 
 uint32_t Bilinear_Fixed(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
                         uint32_t bottomRight, uint32_t* out) {
-  uint32_t result = 0xFF000000u;
-  for (int shift = 16; shift >= 0; shift -= 8) {
-    const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
-    const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
-    const int top = tr * fx + tl * (2048 - fx);
-    const int bottom = br * fx + bl * (2048 - fx);
-    const int value = ((2048 - fy) * top + fy * bottom) >> 22;
-    result |= static_cast<uint32_t>(value & 255) << shift;
-  }
-  *out = result;
-  return result;
+  *out = bilinear(fx, fy, topLeft, topRight, bottomLeft, bottomRight);
+  return *out;
 }
 
 int px_twirl(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius, int angle,
@@ -269,6 +293,23 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
   const int R2 = (500 * radius * radius + 128) >> 8;
   if (R2 <= 0) return PX_OK;  // wrapped past 32 bits: no pixel is inside
   const int per = 0x40000000 / R2;
+  // The bulge's divisor depends only on the falloff step i (0..255, or none
+  // outside): on the fast path its quotients come from tables.
+  struct Step {
+    uint32_t m;
+    int Dn, inv;
+    Divisor div;
+  };
+  Step steps[257];
+  const bool fast = strength >= 0 && !px_scalar_only();
+  if (fast) {
+    for (int i = 0; i <= 256; ++i) {
+      const uint32_t L = i < 256 ? EXP_n7[i] >> 7 : 0;
+      const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
+      const int Dn = static_cast<int>(m + 0x40000);
+      steps[i] = {m, Dn, 0x40000000 / Dn, divisor_of(static_cast<uint32_t>(Dn))};
+    }
+  }
   visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
@@ -276,7 +317,15 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
     const int i = (per * d2) >> 22;
     const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
     int xi, yi, fx, fy;
-    if (strength >= 0) {
+    if (fast) {
+      const Step& st = steps[(i >= 0 && i < 256) ? i : 256];
+      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
+      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + st.m * static_cast<uint32_t>(centerY));
+      xi = divide(X, st.div);
+      yi = divide(Y, st.div);
+      fx = (st.inv * (X - st.Dn * xi)) >> 19;
+      fy = (st.inv * (Y - st.Dn * yi)) >> 19;
+    } else if (strength >= 0) {
       const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
       const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
       const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));

@@ -65,27 +65,80 @@ inline int luma(int p) {
   return (307 * ((p >> 16) & 0xFF) + 601 * ((p >> 8) & 0xFF) + 117 * (p & 0xFF)) >> 10;
 }
 
+// The working geometry of one enlarged box; `ok` false when the box is not
+// filtered (empty, sampling above 400, no distance weight).
+struct BoxPlan {
+  int x0, y0, w, h;
+  int sampling, wmin, sw, sh;
+  bool ok;
+};
+
+BoxPlan plan_of(const caFaceBox& box, int strength) {
+  BoxPlan p{box.x, box.y, box.width, box.height, 0, 0, 0, 0, false};
+  if (p.w < 1 || p.h < 1 || strength < 0) return p;
+  p.sampling = ((kReciprocal.v[200] * p.w) >> 13) + 1;
+  if (p.sampling > 400) return p;
+  p.wmin = DistanceWeightBase(p.w, p.h);
+  if (p.wmin <= 0) return p;
+  p.sw = (p.w + p.sampling - 1) / p.sampling;
+  p.sh = (p.h + p.sampling - 1) / p.sampling;
+  p.ok = true;
+  return p;
+}
+
+// The whole photo, in place.
+struct FullView {
+  int* argb;
+  int width;
+  int& at(int x, int y) const { return argb[static_cast<size_t>(y) * width + x]; }
+  // fn(pixel, x, y) for every pixel of [x0, x1) x [y0, y1).
+  template <class Fn>
+  void each(int x0, int x1, int y0, int y1, Fn fn) const {
+    for (int y = y0; y < y1; ++y)
+      for (int x = x0; x < x1; ++x) fn(argb[static_cast<size_t>(y) * width + x], x, y);
+  }
+};
+
+// A grid of photo pixels: columns cols[0..nx) and rows rows[0..ny), both
+// increasing; before[x] counts the grid columns left of photo column x
+// (width + 1 entries), so a grid column x has index before[x]; the same
+// for rows.
+struct GridView {
+  int* g;
+  int nx;
+  const int* cols;
+  const int* rows;
+  const int* beforeCol;
+  const int* beforeRow;
+  int& at(int x, int y) const { return g[static_cast<size_t>(beforeRow[y]) * nx + beforeCol[x]]; }
+  template <class Fn>
+  void each(int x0, int x1, int y0, int y1, Fn fn) const {
+    for (int r = beforeRow[y0]; r < beforeRow[y1]; ++r)
+      for (int c = beforeCol[x0]; c < beforeCol[x1]; ++c) fn(g[static_cast<size_t>(r) * nx + c], cols[c], rows[r]);
+  }
+};
+
 // One enlarged box: the sampled luminance bins of the whole box are taken
 // before anything is written, so the result does not depend on the block
 // layout; blocks of at most MAXW x MAXH pixels then bound the memory of the
 // integral histograms (each block's histograms reach 2 * radius beyond it).
-void DoFilterRGB(int* argb, int width, const caFaceBox& box, int strength, int radius) {
-  const int x0 = box.x, y0 = box.y, w = box.width, h = box.height;
-  if (w < 1 || h < 1 || strength < 0) return;
-  const int sampling = ((kReciprocal.v[200] * w) >> 13) + 1;
-  if (sampling > 400) return;
-  const int wmin = DistanceWeightBase(w, h);
-  if (wmin <= 0) return;
+// Every pixel's result depends only on its own value and the histograms, so
+// a grid that holds the box's sample points gives the photo's result at the
+// grid's pixels.
+template <class View>
+void DoFilterRGB(const View& view, const BoxPlan& plan, int strength, int radius) {
+  if (!plan.ok) return;
+  const int x0 = plan.x0, y0 = plan.y0, w = plan.w, h = plan.h;
+  const int sampling = plan.sampling, wmin = plan.wmin, sw = plan.sw, sh = plan.sh;
   const int32_t* K = kKernels.k[strength / 511 > 3 ? 3 : strength / 511];
 
   // getY_sampling: the binned luminance of every sampling-th pixel.
-  const int sw = (w + sampling - 1) / sampling, sh = (h + sampling - 1) / sampling;
   unsigned char* bins = static_cast<unsigned char*>(px_malloc(static_cast<size_t>(sw) * sh, 1));
   if (!bins) return;
   for (int j = 0; j < sh; ++j)
     for (int i = 0; i < sw; ++i)
       bins[static_cast<size_t>(j) * sw + i] =
-          static_cast<unsigned char>(luma(argb[static_cast<size_t>(y0 + j * sampling) * width + x0 + i * sampling]) >> 3);
+          static_cast<unsigned char>(luma(view.at(x0 + i * sampling, y0 + j * sampling)) >> 3);
 
   // Window of a tile in samples: i - eL .. i + eR.
   const int border = 2 * radius;
@@ -126,38 +179,66 @@ void DoFilterRGB(int* argb, int width, const caFaceBox& box, int strength, int r
           const int px0 = x0 + ti * sampling, py0 = y0 + tj * sampling;
           const int px1 = px0 + sampling < x0 + w ? px0 + sampling : x0 + w;
           const int py1 = py0 + sampling < y0 + h ? py0 + sampling : y0 + h;
-          for (int py = py0; py < py1; ++py)
-            for (int px = px0; px < px1; ++px) {
-              int& pixel = argb[static_cast<size_t>(py) * width + px];
-              const int R = (pixel >> 16) & 0xFF, G = (pixel >> 8) & 0xFF, B = pixel & 0xFF;
-              if (!IsSkin(R, G, B)) continue;
-              const int weight = DistanceWeight(px - cx, py - cy, w, h, wmin);
-              const int Y = (307 * R + 601 * G + 117 * B) >> 10;
-              int Yn = Y;  // weight 0: the local mean does not matter
-              if (weight > 0) {
-                int64_t num = 0, den = 0;
-                for (int k = 0; k < kBeautyBins; ++k) {
-                  if (!hist[k]) continue;
-                  const int64_t c = hist[k] * K[Y - (k << 3) + 255];
-                  num += static_cast<int64_t>(k << 3) * c;
-                  den += c;
-                }
-                const int newY = static_cast<int>(num / den);
-                Yn = (Y + (((newY - Y) * weight) >> 8)) & 255;
+          view.each(px0, px1, py0, py1, [&](int& pixel, int px, int py) {
+            const int R = (pixel >> 16) & 0xFF, G = (pixel >> 8) & 0xFF, B = pixel & 0xFF;
+            if (!IsSkin(R, G, B)) return;
+            const int weight = DistanceWeight(px - cx, py - cy, w, h, wmin);
+            const int Y = (307 * R + 601 * G + 117 * B) >> 10;
+            int Yn = Y;  // weight 0: the local mean does not matter
+            if (weight > 0) {
+              int64_t num = 0, den = 0;
+              for (int k = 0; k < kBeautyBins; ++k) {
+                if (!hist[k]) continue;
+                const int64_t c = hist[k] * K[Y - (k << 3) + 255];
+                num += static_cast<int64_t>(k << 3) * c;
+                den += c;
               }
-              const int Cb = ((-173 * R - 339 * G + 512 * B + 131072) >> 10) - 128;
-              const int Cr = ((512 * R - 429 * G - 83 * B + 131072) >> 10) - 128;
-              auto clip = [](int v) { return v > 254 ? 255 : (v < 0 ? 0 : v); };
-              const int r2 = clip((1024 * Yn + 1404 * Cr) >> 10);
-              const int g2 = clip((1024 * Yn - 715 * Cr - 344 * Cb) >> 10);
-              const int b2 = clip((1024 * Yn + 1774 * Cb) >> 10);
-              pixel = static_cast<int>((static_cast<unsigned>(pixel) & 0xFF000000u) |
-                                       static_cast<unsigned>(r2 << 16 | g2 << 8 | b2));
+              const int newY = static_cast<int>(num / den);
+              Yn = (Y + (((newY - Y) * weight) >> 8)) & 255;
             }
+            const int Cb = ((-173 * R - 339 * G + 512 * B + 131072) >> 10) - 128;
+            const int Cr = ((512 * R - 429 * G - 83 * B + 131072) >> 10) - 128;
+            auto clip = [](int v) { return v > 254 ? 255 : (v < 0 ? 0 : v); };
+            const int r2 = clip((1024 * Yn + 1404 * Cr) >> 10);
+            const int g2 = clip((1024 * Yn - 715 * Cr - 344 * Cb) >> 10);
+            const int b2 = clip((1024 * Yn + 1774 * Cb) >> 10);
+            pixel = static_cast<int>((static_cast<unsigned>(pixel) & 0xFF000000u) |
+                                     static_cast<unsigned>(r2 << 16 | g2 << 8 | b2));
+          });
         }
       px_free(integral);
     }
   px_free(bins);
+}
+
+// Enlarged boxes and the level's strength and radius; null when memory ran
+// out.
+caFaceBox* enlarged_boxes(const caFaceBox* faces, int count, int width, int height, int level, int* strength,
+                          int* radius) {
+  caFaceBox* boxes = static_cast<caFaceBox*>(px_malloc(static_cast<size_t>(count), sizeof(caFaceBox)));
+  if (!boxes) return nullptr;
+  std::memcpy(boxes, faces, static_cast<size_t>(count) * sizeof(caFaceBox));
+  NewFaceBox(boxes, count, width, height, 2);
+  // The first face's box sets the radius for every face.
+  SetVar(level, boxes[0].width, strength, radius);
+  return boxes;
+}
+
+// Marks the positions v0, v0 + step, ... (n of them) in `mark`.
+void mark_steps(unsigned char* mark, int v0, int step, int n) {
+  for (int k = 0; k < n; ++k) mark[v0 + k * step] = 1;
+}
+
+// before[v] = marks left of v (n + 1 entries); list = the marked positions.
+// Returns the count.
+int index_marks(const unsigned char* mark, int n, int* before, int* list) {
+  int count = 0;
+  for (int v = 0; v < n; ++v) {
+    before[v] = count;
+    if (mark[v]) list[count++] = v;
+  }
+  before[n] = count;
+  return count;
 }
 
 }  // namespace
@@ -223,14 +304,59 @@ int DistanceWeight(int dx, int dy, int w, int h, int wmin) {
 
 void Face_BeautifierRGB(int* argb, int height, int width, int level, const caFaceBox* faces, int count) {
   if (!argb || !faces || count < 1 || width < 1 || height < 1) return;
-  caFaceBox* boxes = static_cast<caFaceBox*>(px_malloc(static_cast<size_t>(count), sizeof(caFaceBox)));
-  if (!boxes) return;
-  std::memcpy(boxes, faces, static_cast<size_t>(count) * sizeof(caFaceBox));
-  NewFaceBox(boxes, count, width, height, 2);
   int strength, radius;
-  // The first face's box sets the radius for every face.
-  SetVar(level, boxes[0].width, &strength, &radius);
+  caFaceBox* boxes = enlarged_boxes(faces, count, width, height, level, &strength, &radius);
+  if (!boxes) return;
   if (strength >= 0)
-    for (int i = 0; i < count; ++i) DoFilterRGB(argb, width, boxes[i], strength, radius);
+    for (int i = 0; i < count; ++i) DoFilterRGB(FullView{argb, width}, plan_of(boxes[i], strength), strength, radius);
   px_free(boxes);
+}
+
+bool Face_BeautifierRGB_At(const int* argb, int height, int width, int level, const caFaceBox* faces, int count,
+                           const int* xs, int nx, const int* ys, int ny, int* out, int stride) {
+  if (!argb || !out || !xs || !ys || nx < 1 || ny < 1 || width < 1 || height < 1) return true;
+  int strength = -1, radius = 0;
+  caFaceBox* boxes = nullptr;
+  if (faces && count > 0) {
+    boxes = enlarged_boxes(faces, count, width, height, level, &strength, &radius);
+    if (!boxes) return false;
+  }
+  // The grid: the wanted pixels and every filtered box's sample points.
+  const size_t w = static_cast<size_t>(width), h = static_cast<size_t>(height);
+  unsigned char* markCol = static_cast<unsigned char*>(px_calloc(w + h, 1));
+  int* index = static_cast<int*>(px_malloc(2 * (w + h) + 2, sizeof(int)));
+  int* grid = nullptr;
+  bool done = false;
+  if (markCol && index) {
+    unsigned char* markRow = markCol + w;
+    int* beforeCol = index;
+    int* beforeRow = beforeCol + w + 1;
+    int* cols = beforeRow + h + 1;
+    int* rows = cols + w;
+    for (int i = 0; i < nx; ++i) markCol[xs[i]] = 1;
+    for (int j = 0; j < ny; ++j) markRow[ys[j]] = 1;
+    for (int b = 0; strength >= 0 && b < count; ++b) {
+      const BoxPlan p = plan_of(boxes[b], strength);
+      if (!p.ok) continue;
+      mark_steps(markCol, p.x0, p.sampling, p.sw);
+      mark_steps(markRow, p.y0, p.sampling, p.sh);
+    }
+    const int gx = index_marks(markCol, width, beforeCol, cols);
+    const int gy = index_marks(markRow, height, beforeRow, rows);
+    grid = static_cast<int*>(px_malloc(static_cast<size_t>(gx) * static_cast<size_t>(gy), sizeof(int)));
+    if (grid) {
+      for (int r = 0; r < gy; ++r)
+        for (int c = 0; c < gx; ++c) grid[static_cast<size_t>(r) * gx + c] = argb[rows[r] * w + cols[c]];
+      const GridView view{grid, gx, cols, rows, beforeCol, beforeRow};
+      for (int b = 0; strength >= 0 && b < count; ++b) DoFilterRGB(view, plan_of(boxes[b], strength), strength, radius);
+      for (int j = 0; j < ny; ++j)
+        for (int i = 0; i < nx; ++i) out[static_cast<size_t>(j) * stride + i] = view.at(xs[i], ys[j]);
+      done = true;
+    }
+  }
+  px_free(grid);
+  px_free(index);
+  px_free(markCol);
+  px_free(boxes);
+  return done;
 }

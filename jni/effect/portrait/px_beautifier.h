@@ -39,6 +39,14 @@ int DistanceWeight(int dx, int dy, int w, int h, int wmin);
 // boxes in photo coordinates.
 void Face_BeautifierRGB(int* argb, int height, int width, int level, const caFaceBox* faces, int count);
 
+// The beautifier's result at sampled pixels, without touching the photo:
+// out[j * stride + i] = the pixel (xs[i], ys[j]) (each inside the photo) of
+// the photo as Face_BeautifierRGB would leave it. Only those pixels and the
+// boxes' luminance sample points are filtered, so a preview costs what it
+// shows. False (out untouched) when memory ran out.
+bool Face_BeautifierRGB_At(const int* argb, int height, int width, int level, const caFaceBox* faces, int count,
+                           const int* xs, int nx, const int* ys, int ny, int* out, int stride);
+
 // The tile working limits and the histogram size.
 constexpr int MAXW = 400;
 constexpr int MAXH = 560;

@@ -7,8 +7,10 @@
 
 #include "../blur/px_blur.h"
 #include "../kalo/px_mem.h"
+#include "../kalo/px_parallel.h"
 #include "../px_color/px_brush.h"
 #include "../px_types.h"
+#include "../face/fd_detector.h"
 #include "px_beautifier.h"
 
 namespace {
@@ -68,11 +70,34 @@ void reduce(const int* full, int width, int height, int* dst, int pw, int ph) {
   }
 }
 
-int* copy_of(const int* src, int width, int height) {
-  int* p = static_cast<int*>(px_malloc(pixels(width, height), sizeof(int)));
-  if (p) std::memcpy(p, src, pixels(width, height) * sizeof(int));
-  return p;
-}
+// The photo positions a preview samples: preview column i shows photo column
+// xs[i] for i < nx, row j photo row ys[j] for j < ny (the same Q12 step as
+// reduce; preview pixels beyond nx or ny have no source).
+struct Samples {
+  int* xs = nullptr;
+  int* ys = nullptr;
+  int nx = 0, ny = 0;
+  int64_t step = 0;
+  bool take(int width, int height, int pw, int ph) {
+    step = static_cast<int64_t>(static_cast<float>(static_cast<int64_t>(width) << 12) / static_cast<float>(pw));
+    xs = static_cast<int*>(px_malloc(static_cast<size_t>(pw), sizeof(int)));
+    ys = static_cast<int*>(px_malloc(static_cast<size_t>(ph), sizeof(int)));
+    if (!xs || !ys) return false;
+    while (nx < pw && ((nx * step) >> 12) < width) {
+      xs[nx] = static_cast<int>((nx * step) >> 12);
+      ++nx;
+    }
+    while (ny < ph && ((ny * step) >> 12) < height) {
+      ys[ny] = static_cast<int>((ny * step) >> 12);
+      ++ny;
+    }
+    return true;
+  }
+  ~Samples() {
+    px_free(xs);
+    px_free(ys);
+  }
+};
 
 bool face_index_ok(int faceIndex) { return faceIndex >= 0 && faceIndex < g_FE->faceCount; }
 
@@ -100,6 +125,9 @@ int apply_beautifier(const int* src, int* dst, int width, int height, int level,
   return memory_held(failures) ? PX_OK : PX_ERR_ALLOC;
 }
 
+// The beautifier seen through the preview: only the sampled pixels (and the
+// faces' luminance sample points) are filtered, with the same result as
+// reducing a beautified full-size copy.
 int beautifier_preview(const int* src, int width, int height, int* dst, int pw, int ph, int level, int faceIndex,
                        bool single) {
   if (!usable(src, dst, width, height) || pw < 1 || ph < 1) return PX_ERR_NULL;
@@ -111,13 +139,27 @@ int beautifier_preview(const int* src, int width, int height, int* dst, int pw, 
   g_FE->beautyLevel = level;
   if (g_FE->faceCount < 1 || (single && !face_index_ok(faceIndex))) return PX_OK;
   const long failures = px_mem_failures();
-  int* scratch = copy_of(src, width, height);
-  if (!scratch) return PX_ERR_ALLOC;
-  beautify(scratch, width, height, single ? faceIndex : -1);
-  const bool held = memory_held(failures);
-  if (held) reduce(scratch, width, height, dst, pw, ph);
-  px_free(scratch);
-  return held ? PX_OK : PX_ERR_ALLOC;
+  Samples s;
+  if (!s.take(width, height, pw, ph)) return PX_ERR_ALLOC;
+  // The faces the full form hands to the beautifier.
+  const int first = single ? faceIndex : 0;
+  int count = single ? 1 : g_FE->faceCount;
+  if (count > kFdListSize) count = kFdListSize;
+  const bool beautifies = (g_FE->beautyMode & 0xF0) != 0;
+  if (!beautifies) {
+    reduce(src, width, height, dst, pw, ph);
+    return PX_OK;
+  }
+  // Written only when everything went through.
+  int* out = static_cast<int*>(px_malloc(static_cast<size_t>(s.nx > 0 ? s.nx : 1) * (s.ny > 0 ? s.ny : 1), sizeof(int)));
+  if (!out) return PX_ERR_ALLOC;
+  const bool ok = Face_BeautifierRGB_At(src, height, width, g_FE->beautyLevel, g_FE->faceRect + first, count, s.xs,
+                                        s.nx, s.ys, s.ny, out, s.nx) &&
+                  memory_held(failures);
+  if (ok)
+    for (int j = 0; j < s.ny; ++j) std::memcpy(dst + static_cast<size_t>(j) * pw, out + static_cast<size_t>(j) * s.nx, s.nx * sizeof(int));
+  px_free(out);
+  return ok ? PX_OK : PX_ERR_ALLOC;
 }
 
 // Lighting of all faces (faceIndex < 0) or one, in place.
@@ -142,16 +184,26 @@ int light_full(const int* src, int* dst, int width, int height, int level, int f
   return PX_OK;
 }
 
+// The brushes are per pixel: the preview reduces src and applies them to the
+// sampled pixels only, with the same result as reducing a lit full-size copy.
 int light_preview(const int* src, int width, int height, int* dst, int pw, int ph, int level, int faceIndex,
                   bool single) {
   if (!usable(src, dst, width, height) || pw < 1 || ph < 1 || !g_FE) return PX_ERR_NULL;
   if (level == 10) return PX_OK;
-  int* scratch = copy_of(src, width, height);
-  if (!scratch) return PX_ERR_ALLOC;
+  Samples s;
+  if (!s.take(width, height, pw, ph)) return PX_ERR_ALLOC;
+  reduce(src, width, height, dst, pw, ph);
   // An index outside the faces leaves the plain copy, as the full form does.
-  if (!single || face_index_ok(faceIndex)) light(scratch, width, height, level, single ? faceIndex : -1);
-  reduce(scratch, width, height, dst, pw, ph);
-  px_free(scratch);
+  if (single && !face_index_ok(faceIndex)) return PX_OK;
+  const int amount = 3 * level - 30;
+  for (int i = 0; i < g_FE->faceCount; ++i) {
+    if (single && i != faceIndex) continue;
+    const caFaceBox& f = g_FE->faceRect[i];
+    const int cx = f.x + (f.width >> 1), cy = f.y + (f.height >> 1);
+    const int reach = f.width > f.height ? f.width : f.height;
+    if (amount > 0) px_apply_lighten_at(dst, pw, s.xs, s.nx, s.ys, s.ny, cx, cy, amount, reach);
+    else px_apply_darken_at(dst, pw, s.xs, s.nx, s.ys, s.ny, cx, cy, -amount, reach);
+  }
   return PX_OK;
 }
 
@@ -321,21 +373,30 @@ void px_outfocus_weight_map(unsigned char* map, int width, int height, const caF
 }
 
 void px_outfocus_compose(const int* sharp, const int* blurred, const unsigned char* map, int* dst, int n) {
-  for (int i = 0; i < n; ++i) {
-    const int m = map[i];
-    if (m == 255) {
-      dst[i] = blurred[i];
-      continue;
-    }
-    const unsigned b = static_cast<unsigned>(blurred[i]), s = static_cast<unsigned>(sharp[i]);
-    unsigned out = 0xFF000000u;  // mixed pixels are opaque
-    for (int shift = 0; shift <= 16; shift += 8) {
-      unsigned v = (m * ((b >> shift) & 0xFF) + (255 - m) * ((s >> shift) & 0xFF)) >> 8;
-      if (v > 255) v = 255;
-      out |= v << shift;
-    }
-    dst[i] = static_cast<int>(out);
-  }
+  // Runs of 16384 pixels on the row-band workers; every pixel stands alone
+  // (dst may be blurred or sharp itself).
+  constexpr int kRun = 1 << 14;
+  px_for_rows(
+      (n + kRun - 1) / kRun,
+      [&](int r0, int r1) {
+        const int end = static_cast<int64_t>(r1) * kRun < n ? r1 * kRun : n;
+        for (int i = r0 * kRun; i < end; ++i) {
+          const int m = map[i];
+          if (m == 255) {
+            dst[i] = blurred[i];
+            continue;
+          }
+          const unsigned b = static_cast<unsigned>(blurred[i]), s = static_cast<unsigned>(sharp[i]);
+          unsigned out = 0xFF000000u;  // mixed pixels are opaque
+          for (int shift = 0; shift <= 16; shift += 8) {
+            unsigned v = (m * ((b >> shift) & 0xFF) + (255 - m) * ((s >> shift) & 0xFF)) >> 8;
+            if (v > 255) v = 255;
+            out |= v << shift;
+          }
+          dst[i] = static_cast<int>(out);
+        }
+      },
+      4);
 }
 
 int px_control_outfocusing_in_portrait(const int* src, int* dst, int width, int height, int strength) {
@@ -360,18 +421,44 @@ int px_control_outfocusing_in_portrait_preview(const int* src, int width, int he
                                                int previewHeight, int strength) {
   if (!usable(src, dst, width, height) || previewWidth < 1 || previewHeight < 1 || !g_FE) return PX_ERR_NULL;
   if (strength < 0) return PX_ERR_EFFECT;
-  const size_t n = pixels(width, height);
+  // Reduce first, then out-focus the reduced photo: the blur radius and the
+  // faces are scaled by the preview's step.
   const long failures = px_mem_failures();
+  Samples s;
+  if (!s.take(width, height, previewWidth, previewHeight)) return PX_ERR_ALLOC;
+  if (s.nx < 1 || s.ny < 1) return PX_OK;  // no preview pixel has a source
+  const size_t n = pixels(s.nx, s.ny);
+  int* small = static_cast<int*>(px_malloc(n, sizeof(int)));
   int* blurred = static_cast<int*>(px_malloc(n, sizeof(int)));
+  const int faces = g_FE->faceCount;
+  caFaceBox* scaled = static_cast<caFaceBox*>(px_malloc(static_cast<size_t>(faces > 0 ? faces : 1), sizeof(caFaceBox)));
+  unsigned char* map = static_cast<unsigned char*>(px_malloc(n, 1));
   int rc = PX_ERR_ALLOC;
-  if (blurred) {
-    // The out-focus blur only reads its input.
-    rc = px_blur_outfocus(const_cast<int*>(src), blurred, width, height, strength) == 0 ? PX_OK : PX_ERR_EFFECT;
+  if (small && blurred && scaled && map) {
+    for (int j = 0; j < s.ny; ++j)
+      for (int i = 0; i < s.nx; ++i)
+        small[static_cast<size_t>(j) * s.nx + i] = src[static_cast<size_t>(s.ys[j]) * width + s.xs[i]];
+    const int64_t radius = ((static_cast<int64_t>(px_blur_outfocus_radius(strength)) << 12) + s.step / 2) / s.step;
+    rc = px_blur_variable(small, blurred, s.nx, s.ny, radius < 1 ? 1 : static_cast<int>(radius)) == 0 ? PX_OK
+                                                                                                       : PX_ERR_EFFECT;
     if (rc == PX_OK && !memory_held(failures)) rc = PX_ERR_ALLOC;  // nothing was blurred
-    // Compose in place over the blurred copy, then reduce.
-    if (rc == PX_OK) rc = outfocus_compose_faces(src, blurred, blurred, width, height);
-    if (rc == PX_OK) reduce(blurred, width, height, dst, previewWidth, previewHeight);
+    if (rc == PX_OK) {
+      auto to_preview = [&s](int32_t v) { return static_cast<int32_t>((static_cast<int64_t>(v) << 12) / s.step); };
+      for (int f = 0; f < faces; ++f) {
+        const caFaceBox& b = g_FE->faceRect[f];
+        scaled[f] = {to_preview(b.x), to_preview(b.y), to_preview(b.width), to_preview(b.height)};
+      }
+      std::memset(map, 255, n);
+      px_outfocus_weight_map(map, s.nx, s.ny, scaled, faces);
+      px_outfocus_compose(small, blurred, map, blurred, static_cast<int>(n));
+      for (int j = 0; j < s.ny; ++j)
+        std::memcpy(dst + static_cast<size_t>(j) * previewWidth, blurred + static_cast<size_t>(j) * s.nx,
+                    static_cast<size_t>(s.nx) * sizeof(int));
+    }
   }
+  px_free(map);
+  px_free(scaled);
   px_free(blurred);
+  px_free(small);
   return rc;
 }

@@ -71,8 +71,11 @@ int px_control_light_in_portrait_singleface_preview(const int* src, int width, i
 // The photo blurred at `strength` (0..7), kept sharp around each face and the
 // body below it. Strength 0 writes nothing; a negative strength gives 40971.
 int px_control_outfocusing_in_portrait(const int* src, int* dst, int width, int height, int strength);
-// The same with the out-focus blur (radius 3..63 for 0..7), reduced into the
-// preview; a negative strength gives 40971.
+// The preview reduces first and out-focuses the reduced photo: the photo is
+// sampled with the preview step, blurred by the out-focus blur with its
+// radius (3..63 for 0..7) divided by the step (rounded, at least 1), and
+// composed by the weight map of the faces divided by the step; it costs
+// what it shows. A negative strength gives 40971.
 int px_control_outfocusing_in_portrait_preview(const int* src, int width, int height, int* dst, int previewWidth,
                                                int previewHeight, int strength);
 

@@ -59,16 +59,21 @@ int64_t quadratic_step(int r) {
   return static_cast<int64_t>(4194304.0f / r2);
 }
 
+// One pixel of the lighten brush at squared distance d2 < r2.
+uint32_t lighten_pixel(uint32_t p, int64_t d2, int64_t r2, int64_t inv, int strength) {
+  const int64_t e = r2 - d2;
+  return per_channel(p, [&](int c) {
+    int64_t v = ((c * d2 + (c + static_cast<int64_t>(strength)) * e) * inv) >> 22;
+    if (v > 255) v = 255;
+    return static_cast<int>(v < c ? c : v);
+  });
+}
+
 void lighten(int* image, int cx, int cy, int width, int height, int strength, int r) {
   if (r <= 0) return;
   const int64_t inv = quadratic_step(r);
   for_brush(image, cx, cy, width, height, r, [&](uint32_t p, int, int, int64_t d2, int64_t r2) {
-    const int64_t e = r2 - d2;
-    return per_channel(p, [&](int c) {
-      int64_t v = ((c * d2 + (c + static_cast<int64_t>(strength)) * e) * inv) >> 22;
-      if (v > 255) v = 255;
-      return static_cast<int>(v < c ? c : v);
-    });
+    return lighten_pixel(p, d2, r2, inv, strength);
   });
 }
 
@@ -114,6 +119,37 @@ void refresh_preview(const int* image, int width, int height, int* preview, int 
 int64_t distance(int64_t d2) {
   if (d2 <= 0x7FFFFFFF) return isqrt_(static_cast<int>(d2));
   return static_cast<int64_t>(std::sqrt(static_cast<double>(d2)) + 0.5);
+}
+
+// One pixel of the full-picture darken brush at squared distance d2 < r^2;
+// k = 2^20 / r.
+uint32_t darken_pixel(uint32_t p, int64_t d2, int r, int64_t k, int strength) {
+  const int64_t d = distance(d2);
+  return per_channel(p, [&](int c) {
+    int64_t v = ((c * d + (c - static_cast<int64_t>(strength)) * (r - d)) * k) >> 20;
+    // A negative strength lightens: keep the channel within a byte.
+    return static_cast<int>(v < 0 ? 0 : (v > 255 ? 255 : v));
+  });
+}
+
+// Calls fn(pixel, d2, r2) for the sampled pixels strictly inside the brush:
+// pixel (i, j) of `pixels` (rows `stride` apart) is the photo pixel
+// (xs[i], ys[j]).
+template <class Fn>
+void for_brush_at(int* pixels, int stride, const int* xs, int nx, const int* ys, int ny, int cx, int cy, int r,
+                  Fn fn) {
+  if (!pixels || !xs || !ys || r <= 0) return;
+  const int64_t r2 = static_cast<int64_t>(r) * r;
+  for (int j = 0; j < ny; ++j) {
+    const int64_t dy = static_cast<int64_t>(cy) - ys[j];
+    if (dy * dy >= r2) continue;
+    uint32_t* row = reinterpret_cast<uint32_t*>(pixels) + static_cast<size_t>(j) * static_cast<size_t>(stride);
+    for (int i = 0; i < nx; ++i) {
+      const int64_t dx = static_cast<int64_t>(cx) - xs[i];
+      const int64_t d2 = dx * dx + dy * dy;
+      if (d2 < r2) row[i] = fn(row[i], d2, r2);
+    }
+  }
 }
 
 // Cell arithmetic with the target's shift rule: a shift of 32 or more (low
@@ -204,15 +240,26 @@ void px_apply_darken(int* image, int cx, int cy, int width, int height, int stre
     for (int x = b.x0; x <= b.x1; ++x) {
       const int64_t d2 = sq[cx > x ? cx - x : x - cx] + dy2;
       if (d2 >= r2) continue;
-      const int64_t d = distance(d2);
-      row[x] = per_channel(row[x], [&](int c) {
-        int64_t v = ((c * d + (c - static_cast<int64_t>(strength)) * (r - d)) * k) >> 20;
-        // A negative strength lightens: keep the channel within a byte.
-        return static_cast<int>(v < 0 ? 0 : (v > 255 ? 255 : v));
-      });
+      row[x] = darken_pixel(row[x], d2, r, k, strength);
     }
   }
   IF_FREE(sq);
+}
+
+void px_apply_lighten_at(int* pixels, int stride, const int* xs, int nx, const int* ys, int ny, int cx, int cy,
+                         int strength, int r) {
+  if (r <= 0) return;
+  const int64_t inv = quadratic_step(r);
+  for_brush_at(pixels, stride, xs, nx, ys, ny, cx, cy, r,
+               [&](uint32_t p, int64_t d2, int64_t r2) { return lighten_pixel(p, d2, r2, inv, strength); });
+}
+
+void px_apply_darken_at(int* pixels, int stride, const int* xs, int nx, const int* ys, int ny, int cx, int cy,
+                        int strength, int r) {
+  if (r <= 0) return;
+  const int64_t k = 0x100000 / r;
+  for_brush_at(pixels, stride, xs, nx, ys, ny, cx, cy, r,
+               [&](uint32_t p, int64_t d2, int64_t) { return darken_pixel(p, d2, r, k, strength); });
 }
 
 // ---- pixelize ---------------------------------------------------------------------

@@ -20,6 +20,14 @@ void px_apply_lighten_with_preview(int* image, int cx, int cy, int width, int he
 // rounded). Logs "px_apply_darken effect: Low memory" and changes nothing
 // when its distance table cannot be allocated.
 void px_apply_darken(int* image, int cx, int cy, int width, int height, int strength, int r);
+// The lighten brush and the full-picture darken brush on sampled pixels:
+// pixel (i, j) of `pixels` (rows `stride` ints apart, i < nx, j < ny) holds
+// the photo pixel (xs[i], ys[j]) and changes exactly as that photo pixel
+// would. A nearest-neighbour preview thus costs what it shows.
+void px_apply_lighten_at(int* pixels, int stride, const int* xs, int nx, const int* ys, int ny, int cx, int cy,
+                         int strength, int r);
+void px_apply_darken_at(int* pixels, int stride, const int* xs, int nx, const int* ys, int ny, int cx, int cy,
+                        int strength, int r);
 // Preview darken: quadratic like the lighten brush; never lightens.
 void px_apply_darken_with_preview(int* image, int cx, int cy, int width, int height, int* preview,
                                   int preview_width, int preview_height, int strength, int r);

@@ -420,6 +420,121 @@ void box_blur(const uint32_t* in, uint32_t* tmp, uint32_t* out, int width, int h
 }
 }  // namespace
 
+namespace {
+// The glow screened over a pixel: the glow g squared (g * g / 255) and
+// screened, each rounded.
+inline uint32_t glow_pixel(uint32_t p, uint32_t g) {
+  uint32_t o = p & 0xFF000000u;
+  for (int s = 0; s <= 16; s += 8) {
+    const uint32_t c = (p >> s) & 255, gv = (g >> s) & 255;
+    const uint32_t gg = (gv * gv + 127) / 255;
+    o |= (255u - ((255u - c) * (255u - gg) + 127) / 255) << s;
+  }
+  return o;
+}
+
+// glow_pixel by tables: [g] the squared glow, [gg][c] the screen.
+struct GlowTables {
+  unsigned char square[256];
+  unsigned char screen[256][256];
+};
+constexpr GlowTables make_glow_tables() {
+  GlowTables t{};
+  for (uint32_t g = 0; g < 256; ++g) t.square[g] = static_cast<unsigned char>((g * g + 127) / 255);
+  for (uint32_t gg = 0; gg < 256; ++gg)
+    for (uint32_t c = 0; c < 256; ++c)
+      t.screen[gg][c] = static_cast<unsigned char>(255u - ((255u - c) * (255u - gg) + 127) / 255);
+  return t;
+}
+constexpr GlowTables kGlow = make_glow_tables();
+
+inline uint32_t glow_pixel_tables(uint32_t p, uint32_t r, uint32_t g, uint32_t b) {
+  return (p & 0xFF000000u) | static_cast<uint32_t>(kGlow.screen[kGlow.square[r]][(p >> 16) & 255]) << 16 |
+         static_cast<uint32_t>(kGlow.screen[kGlow.square[g]][(p >> 8) & 255]) << 8 |
+         kGlow.screen[kGlow.square[b]][p & 255];
+}
+
+// floor(v / n) as a multiplication by the reciprocal rounded up: exact for
+// v below 2^32 / n, which the box sums keep while n < 4096.
+struct Reciprocal {
+  uint64_t m;
+  explicit Reciprocal(int n) : m(((uint64_t{1} << 32) + static_cast<uint64_t>(n) - 1) / static_cast<uint64_t>(n)) {}
+  uint32_t operator()(uint32_t v) const { return static_cast<uint32_t>((v * m) >> 32); }
+};
+
+// Soft glow with the box blur's divisions as multiplications, the vertical
+// direction walking rows in bands of columns (sums of a band's columns held
+// side by side) and the screen done as each glow pixel comes out. The same
+// sums, hence the same pixels, as box_blur followed by the screen.
+// False when the working picture cannot be had.
+bool softglow_fast(const uint32_t* in, uint32_t* out, int width, int height, int r) {
+  const int win = 2 * r + 1;
+  const size_t w = static_cast<size_t>(width);
+  const size_t n = w * static_cast<size_t>(height);
+  auto* tmp = static_cast<uint32_t*>(px_malloc(n, 4));
+  const int bands = px_band_count(width, 16);
+  auto* sums = static_cast<uint32_t*>(px_malloc(w * 3 + static_cast<size_t>(bands), sizeof(uint32_t)));
+  if (!tmp || !sums) {
+    px_free(tmp);
+    px_free(sums);
+    return false;
+  }
+  const Reciprocal div(win);
+  px_for_rows(height, [&](int y0, int y1) {  // horizontal, as box_blur
+    for (int y = y0; y < y1; ++y) {
+      const uint32_t* row = in + static_cast<size_t>(y) * w;
+      uint32_t* t = tmp + static_cast<size_t>(y) * w;
+      uint32_t s[3] = {0, 0, 0};
+      for (int k = -r; k <= r; ++k) {
+        const uint32_t p = row[k < 0 ? 0 : (k >= width ? width - 1 : k)];
+        s[0] += (p >> 16) & 255, s[1] += (p >> 8) & 255, s[2] += p & 255;
+      }
+      for (int x = 0; x < width; ++x) {
+        t[x] = div(s[0] + r) << 16 | div(s[1] + r) << 8 | div(s[2] + r);
+        const int xo = x - r < 0 ? 0 : x - r, xi = x + r + 1 >= width ? width - 1 : x + r + 1;
+        const uint32_t a = row[xo], b = row[xi];
+        s[0] += ((b >> 16) & 255) - ((a >> 16) & 255);
+        s[1] += ((b >> 8) & 255) - ((a >> 8) & 255);
+        s[2] += (b & 255) - (a & 255);
+      }
+    }
+  });
+  // Vertical: each band of columns keeps its columns' sums side by side and
+  // walks the rows; out may be in itself (each pixel of in is read just
+  // before its own output is written).
+  px_for_rows(
+      width,
+      [&](int x0, int x1) {
+        uint32_t* s = sums + static_cast<size_t>(x0) * 3;
+        const int cols = x1 - x0;
+        for (int c = 0; c < 3 * cols; ++c) s[c] = 0;
+        for (int k = -r; k <= r; ++k) {
+          const uint32_t* t = tmp + static_cast<size_t>(k < 0 ? 0 : (k >= height ? height - 1 : k)) * w + x0;
+          for (int c = 0; c < cols; ++c) {
+            s[3 * c] += (t[c] >> 16) & 255, s[3 * c + 1] += (t[c] >> 8) & 255, s[3 * c + 2] += t[c] & 255;
+          }
+        }
+        for (int y = 0; y < height; ++y) {
+          const size_t row = static_cast<size_t>(y) * w + x0;
+          const int yo = y - r < 0 ? 0 : y - r, yi = y + r + 1 >= height ? height - 1 : y + r + 1;
+          const uint32_t* a = tmp + static_cast<size_t>(yo) * w + x0;
+          const uint32_t* b = tmp + static_cast<size_t>(yi) * w + x0;
+          for (int c = 0; c < cols; ++c) {
+            out[row + c] =
+                glow_pixel_tables(in[row + c], div(s[3 * c] + r), div(s[3 * c + 1] + r), div(s[3 * c + 2] + r));
+            s[3 * c] += ((b[c] >> 16) & 255) - ((a[c] >> 16) & 255);
+            s[3 * c + 1] += ((b[c] >> 8) & 255) - ((a[c] >> 8) & 255);
+            s[3 * c + 2] += (b[c] & 255) - (a[c] & 255);
+          }
+        }
+      },
+      16);
+  px_free(sums);
+  px_free(tmp);
+  return true;
+}
+}  // namespace
+
 // Soft glow: the highlights bloom softly into their surroundings. The
 // picture is box-blurred with radius max(1, min(width, height) / 32); the
 // blur is squared (g * g / 255) so only its bright parts glow; that glow is
@@ -429,6 +544,13 @@ void box_blur(const uint32_t* in, uint32_t* tmp, uint32_t* out, int width, int h
 // is not written.
 void px_softglow(int* in, int* out, int width, int height) {
   if (!in || !out || width <= 0 || height <= 0) return;
+  const int side = width < height ? width : height;
+  const int r = side / 32 > 1 ? side / 32 : 1;
+  if (!px_scalar_only() && 2 * r + 1 < 4096) {
+    if (!softglow_fast(reinterpret_cast<const uint32_t*>(in), reinterpret_cast<uint32_t*>(out), width, height, r))
+      IF_ERROR("Low memory: %s\n", __func__);
+    return;
+  }
   const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
   auto* tmp = static_cast<uint32_t*>(px_malloc(n, 4));
   auto* glow = static_cast<uint32_t*>(px_malloc(n, 4));
@@ -438,19 +560,9 @@ void px_softglow(int* in, int* out, int width, int height) {
     px_free(glow);
     return;
   }
-  const int side = width < height ? width : height;
-  const int r = side / 32 > 1 ? side / 32 : 1;
   box_blur(reinterpret_cast<const uint32_t*>(in), tmp, glow, width, height, r);
   px_free(tmp);
-  px_filter::map2(in, reinterpret_cast<int*>(glow), out, width, height, [](uint32_t p, uint32_t g) -> uint32_t {
-    uint32_t o = p & 0xFF000000u;
-    for (int s = 0; s <= 16; s += 8) {
-      const uint32_t c = (p >> s) & 255, gv = (g >> s) & 255;
-      const uint32_t gg = (gv * gv + 127) / 255;
-      o |= (255u - ((255u - c) * (255u - gg) + 127) / 255) << s;
-    }
-    return o;
-  });
+  px_filter::map2(in, reinterpret_cast<int*>(glow), out, width, height, glow_pixel);
   px_free(glow);
 }
 
@@ -472,7 +584,10 @@ inline uint32_t sharpen_pixel(uint32_t l, uint32_t p, uint32_t r) {
 void sharpen(const int* in, const unsigned char* sel, int* out, int width, int height) {
   if (!in || !out || width <= 0 || height <= 0) return;
   const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
-  auto* scratch = static_cast<uint32_t*>(px_calloc(n, 4));
+  // An output apart from the input takes the pixels straight away (the
+  // scratch picture only serves sharpening in place).
+  const bool direct = !px_scalar_only() && out != in;
+  auto* scratch = direct ? reinterpret_cast<uint32_t*>(out) : static_cast<uint32_t*>(px_calloc(n, 4));
   if (!scratch) {
     IF_ERROR("Low memory: sharpen\n");
     return;
@@ -489,6 +604,7 @@ void sharpen(const int* in, const unsigned char* sel, int* out, int width, int h
       }
     }
   });
+  if (direct) return;
   std::memcpy(out, scratch, n * 4);
   px_free(scratch);
 }

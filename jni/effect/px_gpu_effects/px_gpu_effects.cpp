@@ -277,6 +277,27 @@ bool rugged(int* in, int* out, int* grain, int width, int height) {
   return true;
 }
 
+// Byte to unit values by table: kUnit[v] is v / 255.0, the very value
+// `read` divides out, so the painterly looks below read their pixels
+// without a division (the plain path, GLIMMER_SCALAR, still divides).
+struct UnitTable {
+  double v[256];
+};
+constexpr UnitTable make_unit_table() {
+  UnitTable t{};
+  for (int i = 0; i < 256; ++i) t.v[i] = i / 255.0;
+  return t;
+}
+constexpr UnitTable kUnit = make_unit_table();
+
+Col read_table(uint32_t p) { return {kUnit.v[(p >> 16) & 255], kUnit.v[(p >> 8) & 255], kUnit.v[p & 255]}; }
+
+// The pixel reader of a run: by table on the fast path.
+struct Reader {
+  bool table = !px_scalar_only();
+  Col operator()(uint32_t p) const { return table ? read_table(p) : read(p); }
+};
+
 // Oil pastel: waxy crayon on paper. The 3 x 3 mean (edges repeated) melts
 // fine detail; saturation 1.35 brightens the wax; each channel is
 // posterised softly to 5 bands (floor(5c) + smoothstep(0.35, 0.65, fract(5c)))
@@ -285,13 +306,26 @@ bool rugged(int* in, int* out, int* grain, int width, int height) {
 // through by 0.55 (1 - smoothstep(0.40, 0.52, g)).
 bool oil_pastel(int* in, int* out, int* grain, int width, int height) {
   if (!usable(in, out, width, height) || !grain) return false;
+  const Reader read;
+  const bool fast = read.table;
+  const size_t w = static_cast<size_t>(width);
   each_pixel(width, height, [&](int x, int y, size_t i) {
     const uint32_t p = static_cast<uint32_t>(in[i]);
     Col m{0, 0, 0};
-    for (int dy = -1; dy <= 1; ++dy) {
-      for (int dx = -1; dx <= 1; ++dx) {
-        const Col k = read(at(in, width, height, x + dx, y + dy));
-        m = {m.r + k.r, m.g + k.g, m.b + k.b};
+    if (fast && x > 0 && y > 0 && x + 1 < width && y + 1 < height) {  // no edge to repeat
+      for (int dy = -1; dy <= 1; ++dy) {
+        const int* row = in + (i + dy * w);
+        for (int dx = -1; dx <= 1; ++dx) {
+          const Col k = read_table(static_cast<uint32_t>(row[dx]));
+          m = {m.r + k.r, m.g + k.g, m.b + k.b};
+        }
+      }
+    } else {
+      for (int dy = -1; dy <= 1; ++dy) {
+        for (int dx = -1; dx <= 1; ++dx) {
+          const Col k = read(at(in, width, height, x + dx, y + dy));
+          m = {m.r + k.r, m.g + k.g, m.b + k.b};
+        }
       }
     }
     Col c = saturate({m.r / 9.0, m.g / 9.0, m.b / 9.0}, 1.35);
@@ -339,19 +373,38 @@ bool impressionist(int* in, int* out, int* strokes, int* canvas, int width, int 
   }
   const int side = width < height ? width : height;
   const double s = side / 100 > 2 ? side / 100 : 2;
+  const Reader read;
+  // The move depends on one byte of the stroke texture: a table of it.
+  int move[256];
+  for (int v = 0; v < 256; ++v) move[v] = to_int(std::floor((v / 255.0 - 0.5) * 2.0 * s + 0.5));
   each_pixel(width, height, [&](int x, int y, size_t i) {
-    const Col t = read(static_cast<uint32_t>(strokes[i]));
-    const int sx = x + to_int(std::floor((t.r - 0.5) * 2.0 * s + 0.5));
-    const int sy = y + to_int(std::floor((t.b - 0.5) * 2.0 * s + 0.5));
+    int sx, sy;
+    if (read.table) {
+      const uint32_t t = static_cast<uint32_t>(strokes[i]);
+      sx = x + move[(t >> 16) & 255];
+      sy = y + move[t & 255];
+    } else {
+      const Col t = read(static_cast<uint32_t>(strokes[i]));
+      sx = x + to_int(std::floor((t.r - 0.5) * 2.0 * s + 0.5));
+      sy = y + to_int(std::floor((t.b - 0.5) * 2.0 * s + 0.5));
+    }
     Col c = saturate(read(at(in, width, height, sx, sy)), 1.3);
     auto level = [](double v) { return std::floor(clamp(static_cast<float>(v), 0.0f, 1.0f) * 7.0 + 0.5) / 7.0; };
     work[i] = static_cast<int>(write(0, {level(c.r), level(c.g), level(c.b)}));
   });
+  const size_t w = static_cast<size_t>(width);
   each_pixel(width, height, [&](int x, int y, size_t i) {
     Col m{0, 0, 0};
-    for (int k = -2; k <= 2; ++k) {
-      const Col c = read(at(work, width, height, x + k, y + k));
-      m = {m.r + c.r, m.g + c.g, m.b + c.b};
+    if (read.table && x >= 2 && y >= 2 && x + 2 < width && y + 2 < height) {  // no edge to repeat
+      for (int k = -2; k <= 2; ++k) {
+        const Col c = read_table(static_cast<uint32_t>(work[i + k * (w + 1)]));
+        m = {m.r + c.r, m.g + c.g, m.b + c.b};
+      }
+    } else {
+      for (int k = -2; k <= 2; ++k) {
+        const Col c = read(at(work, width, height, x + k, y + k));
+        m = {m.r + c.r, m.g + c.g, m.b + c.b};
+      }
     }
     const double shade = 0.8 + 0.2 * luma(read(static_cast<uint32_t>(canvas[i])));
     out[i] = static_cast<int>(write(static_cast<uint32_t>(in[i]),
@@ -368,11 +421,32 @@ bool impressionist(int* in, int* out, int* strokes, int* canvas, int width, int 
 // 0.9 + 0.1 paper luma, and the sparkle texture adds 0.6 sparkle.
 bool stucchevole(int* in, int* out, int* glow, int* paper, int* sparkle, int width, int height) {
   if (!usable(in, out, width, height) || !glow || !paper || !sparkle) return false;
+  const Reader read;
+  const Col pink{1.0, 0.72, 0.86};
+  auto sweet = [](double v) { return 0.12 + 0.85 * std::pow(v, 0.75); };
+  // The sweetened colour depends on each channel's byte alone: on the fast
+  // path three tables of it, filled with the same expressions.
+  struct Sweet {
+    double r[256], g[256], b[256];
+  };
+  static const Sweet tables = [&] {
+    Sweet t{};
+    for (int v = 0; v < 256; ++v) {
+      const Col c = mix(grey(v / 255.0), pink, 0.30);
+      t.r[v] = sweet(c.r), t.g[v] = sweet(c.g), t.b[v] = sweet(c.b);
+    }
+    return t;
+  }();
+  const bool fast = !px_scalar_only();
   each_pixel(width, height, [&](int, int, size_t i) {
     const uint32_t p = static_cast<uint32_t>(in[i]);
-    Col c = mix(read(p), {1.0, 0.72, 0.86}, 0.30);
-    auto sweet = [](double v) { return 0.12 + 0.85 * std::pow(v, 0.75); };
-    c = {sweet(c.r), sweet(c.g), sweet(c.b)};
+    Col c;
+    if (fast) {
+      c = {tables.r[(p >> 16) & 255], tables.g[(p >> 8) & 255], tables.b[p & 255]};
+    } else {
+      c = mix(read(p), pink, 0.30);
+      c = {sweet(c.r), sweet(c.g), sweet(c.b)};
+    }
     const Col gl = read(static_cast<uint32_t>(glow[i]));
     c = {1.0 - (1.0 - c.r) * (1.0 - 0.7 * gl.r), 1.0 - (1.0 - c.g) * (1.0 - 0.7 * gl.g),
          1.0 - (1.0 - c.b) * (1.0 - 0.7 * gl.b)};

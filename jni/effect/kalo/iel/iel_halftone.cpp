@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "../if_utils_and.h"
+#include "../px_parallel.h"
 #include "iel_artistic.h"
 #include "iel_internal.h"
 
@@ -160,6 +161,81 @@ void IEL_DarkenOnlyBlendingRGB888(const structIELImage* input, structIELImage* o
   }
 }
 
+namespace {
+// The conversions as tables, filled once with the very same double
+// expressions: a separated ink depends only on its own channel and the
+// pixel's largest channel (the black ink is 1 - max / 255 exactly, being the
+// smallest of the three 1 - channel / 255), and a recombined channel only on
+// its ink and the black.
+struct HalftoneTables {
+  unsigned char ink[256][256];   // [largest channel][channel], largest >= 1
+  unsigned char black[256];      // [largest channel]
+  unsigned char rgb[256][256];   // [black][ink], black >= 1
+  HalftoneTables() {
+    for (int mx = 0; mx < 256; ++mx) {
+      const double kk = 1 - mx / 255.0;
+      black[mx] = store(kk);
+      for (int v = 0; v < 256; ++v) {
+        const double cc = 1 - v / 255.0;
+        ink[mx][v] = mx == 0 ? 1 : store((cc - kk) / (1 - kk));
+      }
+    }
+    for (int k = 0; k < 256; ++k) {
+      const double f = 1 - k / 255.0;
+      for (int c = 0; c < 256; ++c) rgb[k][c] = k < 1 ? 0 : static_cast<unsigned char>((255 - c) * f);
+    }
+  }
+};
+
+const HalftoneTables& halftone_tables() {
+  static const HalftoneTables tables;
+  return tables;
+}
+
+// The separation by the tables, rows on worker threads.
+void separate_fast(const unsigned char* rgb, int width, int height, unsigned char* c, unsigned char* m,
+                   unsigned char* y, unsigned char* k) {
+  const HalftoneTables& t = halftone_tables();
+  const size_t row = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* p = rgb + 3 * i;
+      int mx = p[0] > p[1] ? p[0] : p[1];
+      mx = p[2] > mx ? p[2] : mx;
+      if (mx == 0) {  // pure black: the inks are 1, the black 255
+        c[i] = m[i] = y[i] = 1;
+        k[i] = 255;
+        continue;
+      }
+      c[i] = t.ink[mx][p[0]];
+      m[i] = t.ink[mx][p[1]];
+      y[i] = t.ink[mx][p[2]];
+      k[i] = t.black[mx];
+    }
+  });
+}
+
+// Recombination by the tables and the darken-only blend with the input (an
+// output that is the input itself has already been overwritten when the
+// plain path blends, so it takes the recombined pixels as they are).
+void recombine_fast(const unsigned char* c, const unsigned char* m, const unsigned char* y, const unsigned char* k,
+                    const unsigned char* input, unsigned char* rgb, int width, int height) {
+  const HalftoneTables& t = halftone_tables();
+  const size_t row = static_cast<size_t>(width);
+  const bool in_place = input == rgb;
+  px_for_rows(height, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* ink = t.rgb[k[i]];
+      const unsigned char v[3] = {ink[c[i]], ink[m[i]], ink[y[i]]};
+      for (int ch = 0; ch < 3; ++ch) {
+        const unsigned char a = input[3 * i + ch];
+        rgb[3 * i + ch] = !in_place && a < v[ch] ? a : v[ch];
+      }
+    }
+  });
+}
+}  // namespace
+
 // The first screen (75 degrees, channel 1) takes cyan, the second (45
 // degrees, channel 2, whose dots grow fastest and never vanish) yellow, the
 // least visible ink on paper, and the third (15 degrees, channel 3) magenta;
@@ -169,7 +245,8 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
   const int w = input->width, h = input->height;
   const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
-  std::memcpy(output->buffer, input->buffer, n * 3);
+  const bool fast = !px_scalar_only();
+  if (!fast) std::memcpy(output->buffer, input->buffer, n * 3);
   unsigned char* planes[5] = {};
   bool ok = true;
   for (auto& p : planes) {
@@ -179,9 +256,12 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
   if (!ok) {
     IF_ERROR("Failed to allocate \n");
     for (auto* p : planes) IF_FREE(p);
+    // The copy of the input is the output either way.
+    if (fast) std::memcpy(output->buffer, input->buffer, n * 3);
     return IEL_ERR_ALLOC;
   }
-  IEL_Halftone_RGBtoCMYKconversion(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
+  if (fast) separate_fast(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
+  else IEL_Halftone_RGBtoCMYKconversion(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
   static const double kSlopes[3] = {3.732, 1.0, 0.2679};
   static const int kPlane[3] = {0, 2, 1};  // cyan, yellow, magenta
   for (int i = 0; i < 3; ++i) {
@@ -191,8 +271,12 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
     planes[p] = planes[4];
     planes[4] = t;
   }
-  IEL_Halftone_CMYKtoRGBconversion(planes[0], planes[1], planes[2], planes[3], output->buffer, w, h);
-  IEL_DarkenOnlyBlendingRGB888(input, output);
+  if (fast) {
+    recombine_fast(planes[0], planes[1], planes[2], planes[3], input->buffer, output->buffer, w, h);
+  } else {
+    IEL_Halftone_CMYKtoRGBconversion(planes[0], planes[1], planes[2], planes[3], output->buffer, w, h);
+    IEL_DarkenOnlyBlendingRGB888(input, output);
+  }
   for (auto* p : planes) IF_FREE(p);
   return IEL_OK;
 }

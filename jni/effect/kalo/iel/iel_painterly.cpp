@@ -167,10 +167,58 @@ int IEL_GaussianBlur(structIELImage* input, structIELImage* output) {
   return IEL_OK;
 }
 
+namespace {
+// The mode filter of packed RGB with each pixel's 16-level luminance taken
+// once into a plane: the same 3 x 3 window, visited in the same order (left,
+// middle, right column, each top to bottom), picks the same pixel. False,
+// with nothing written, when the plane could not be allocated.
+bool oilify_rgb_levels(const unsigned char* src, unsigned char* dst, int w, int h) {
+  const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
+  auto* level = n <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n))) : nullptr;
+  if (!level) return false;
+  const size_t row = static_cast<size_t>(w);
+  px_for_rows(h, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* p = src + 3 * i;
+      level[i] = static_cast<unsigned char>(IEL_LumaSum(p[0], p[1], p[2]) >> 14);
+    }
+  });
+  px_for_rows(h, [&](int y0, int y1) {
+    for (int y = y0; y < y1; ++y) {
+      const size_t ys[3] = {(y > 0 ? y - 1 : 0) * row, y * row, (y < h - 1 ? y + 1 : h - 1) * row};
+      unsigned char* o = dst + y * row * 3;
+      for (int x = 0; x < w; ++x) {
+        const int xs[3] = {x > 0 ? x - 1 : 0, x, x < w - 1 ? x + 1 : w - 1};
+        unsigned char hist[16] = {};
+        int best = 0;
+        size_t pick = 0;
+        for (int cx : xs) {
+          for (size_t cy : ys) {
+            const size_t at = cy + cx;
+            if (++hist[level[at]] > best) {
+              best = hist[level[at]];
+              pick = at;
+            }
+          }
+        }
+        std::memcpy(o + 3 * x, src + 3 * pick, 3);
+      }
+    }
+  });
+  IF_FREE(level);
+  return true;
+}
+}  // namespace
+
 int IEL_OilifyFix(structIELImage* input, structIELImage* output) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, packed_pixels)) return rc;
   const int w = input->width, h = input->height;
   const int bpp = IEL_BytesPerPixel(input->format);
+  // (An output that is the input itself needs the plain path's order.)
+  if (bpp == 3 && !px_scalar_only() && input->buffer != output->buffer) {
+    if (oilify_rgb_levels(input->buffer, output->buffer, w, h)) return IEL_OK;
+    return IEL_ERR_ALLOC;
+  }
   const unsigned char* src = input->buffer;
   unsigned char* dst = output->buffer;
   px_for_rows(h, [&](int y0, int y1) {
@@ -215,17 +263,20 @@ int IEL_OilPaintEdge(structIELImage* input, structIELImage* output) {
     return rc;
   }
   const unsigned char* src = input->buffer;
-  for (size_t i = 0; i < n; ++i) {
-    const unsigned char* p = src + 3 * i;
-    unsigned char* q = work + 3 * i;
-    const int d = q[0] - p[0];
-    // Only a blurred red at least two above the pixel's own darkens it.
-    if (d > 0 && d != 1) {
-      for (int c = 0; c < 3; ++c) q[c] = static_cast<unsigned char>(p[c] * p[c] / 255);
-    } else {
-      std::memcpy(q, p, 3);
+  const size_t row = static_cast<size_t>(input->width);
+  px_for_rows(input->height, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const unsigned char* p = src + 3 * i;
+      unsigned char* q = work + 3 * i;
+      const int d = q[0] - p[0];
+      // Only a blurred red at least two above the pixel's own darkens it.
+      if (d > 0 && d != 1) {
+        for (int c = 0; c < 3; ++c) q[c] = static_cast<unsigned char>(p[c] * p[c] / 255);
+      } else {
+        std::memcpy(q, p, 3);
+      }
     }
-  }
+  });
   int rc = IEL_OilifyFix(&blurred, output);
   IF_FREE(work);
   return rc;
@@ -379,10 +430,127 @@ int IEL_Variable_Blur_preview(structIELImage* input, structIELImage* output, uns
   return stopped.load() ? IEL_ERR_CANCELLED : IEL_OK;
 }
 
+namespace {
+// floor(v / d) as (v * kReciprocal[d]) >> 32 with the reciprocal rounded up:
+// exact for every v below 2^32 / d (the sketch divides at most 255 * 255 by
+// d <= 255 and 255 * 121 by the box areas).
+struct Reciprocals {
+  uint32_t v[256];
+};
+constexpr Reciprocals make_reciprocals() {
+  Reciprocals r{};
+  for (int d = 1; d < 256; ++d) r.v[d] = static_cast<uint32_t>(((uint64_t{1} << 32) + d - 1) / d);
+  return r;
+}
+constexpr Reciprocals kReciprocal = make_reciprocals();
+inline uint32_t divide(uint32_t v, int d) {
+  return static_cast<uint32_t>((static_cast<uint64_t>(v) * kReciprocal.v[d]) >> 32);
+}
+
+// IEL_Variable_Blur_preview on a picture whose three channels are equal,
+// done once on one grey plane: running column sums down each band, a running
+// sum along each row, the division by the box area as a multiplication.
+// Progress and cancellation as the blur reports them.
+int grey_box_blur(const unsigned char* in, unsigned char* out, int w, int h, unsigned level) {
+  IELProgressScope progress;
+  static const int kSizes[5] = {3, 5, 7, 9, 11};
+  const int k = kSizes[level > 4 ? 4 : level];
+  const int r = k / 2, area = k * k;
+  const int bands = px_band_count(h, 16);
+  const size_t sum_bytes = sizeof(uint32_t) * static_cast<size_t>(w) * bands;
+  auto* sums = sum_bytes <= 0x7FFFFFFF ? static_cast<uint32_t*>(IF_MALLOC(static_cast<int>(sum_bytes))) : nullptr;
+  if (!sums) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  progress.start(static_cast<uint32_t>(h));
+  std::atomic<bool> stopped{false};
+  std::atomic<int> next_band{0};
+  const size_t row = static_cast<size_t>(w);
+  px_for_rows(
+      h,
+      [&](int y0, int y1) {
+        uint32_t* col = sums + static_cast<size_t>(next_band.fetch_add(1)) * row;
+        for (int x = 0; x < w; ++x) col[x] = 0;
+        for (int dy = -r; dy <= r; ++dy) {
+          const unsigned char* p = in + clampi(y0 + dy, 0, h - 1) * row;
+          for (int x = 0; x < w; ++x) col[x] += p[x];
+        }
+        for (int y = y0; y < y1; ++y) {
+          if (progress.cancelled() || stopped.load(std::memory_order_relaxed)) {
+            stopped.store(true);
+            return;
+          }
+          if (y > y0) {
+            const unsigned char* add = in + clampi(y + r, 0, h - 1) * row;
+            const unsigned char* sub = in + clampi(y - r - 1, 0, h - 1) * row;
+            for (int x = 0; x < w; ++x) col[x] += static_cast<uint32_t>(add[x]) - sub[x];
+          }
+          unsigned char* o = out + y * row;
+          uint32_t acc = 0;
+          for (int dx = -r; dx <= r; ++dx) acc += col[clampi(dx, 0, w - 1)];
+          for (int x = 0; x < w; ++x) {
+            o[x] = static_cast<unsigned char>(divide(acc, area));
+            acc += col[x + r + 1 < w ? x + r + 1 : w - 1] - col[x - r > 0 ? x - r : 0];
+          }
+          progress.advance();
+        }
+      },
+      16);
+  IF_FREE(sums);
+  return stopped.load() ? IEL_ERR_CANCELLED : IEL_OK;
+}
+
+// The sketch on grey planes: every step works on one byte a pixel (the plain
+// path below carries three equal channels), rows on worker threads.
+int sketch_planes(structIELImage* input, structIELImage* output, int strokeDarkness, int blurLevel) {
+  const int w = input->width, h = input->height;
+  const size_t n = pixel_count(input);
+  auto* a = n * 2 <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 2))) : nullptr;
+  if (!a) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  unsigned char* b = a + n;
+  const unsigned char* src = input->buffer;
+  unsigned char* dst = output->buffer;
+  const size_t row = static_cast<size_t>(w);
+  px_for_rows(h, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) a[i] = static_cast<unsigned char>(255 - luma(src + 3 * i));
+  });
+  int rc = grey_box_blur(a, b, w, h, static_cast<unsigned>(blurLevel));
+  if (rc != IEL_OK) {
+    IF_ERROR("Error in Blur:\n");
+    IF_FREE(a);
+    return rc;
+  }
+  px_for_rows(h, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      const int d = 255 - b[i];
+      const uint32_t v = divide(static_cast<uint32_t>(luma(src + 3 * i) * 255), d < 4 ? 4 : d);
+      a[i] = static_cast<unsigned char>(v > 255 ? 255 : v);
+    }
+  });
+  rc = grey_box_blur(a, b, w, h, 0);
+  if (rc == IEL_OK) {
+    px_for_rows(h, [&](int y0, int y1) {
+      for (size_t i = y0 * row; i < y1 * row; ++i) {
+        int c = b[i];
+        for (int k = 0; k < strokeDarkness; ++k) c = c * c >> 8;
+        std::memset(dst + 3 * i, c, 3);
+      }
+    });
+  }
+  IF_FREE(a);
+  return rc;
+}
+}  // namespace
+
 int IEL_SketchNew2(structIELImage* input, structIELImage* output, int strokeDarkness, int blurLevel) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
   strokeDarkness = clampi(strokeDarkness, 1, 3);
   blurLevel = clampi(blurLevel, 1, 2);
+  if (!px_scalar_only()) return sketch_planes(input, output, strokeDarkness, blurLevel);
   const size_t n = pixel_count(input);
   auto* grey = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 3)));
   if (!grey) {
@@ -428,16 +596,18 @@ int IEL_Sketch_Texture(structIELImage* input, structIELImage* output, structIELI
     IF_ERROR("Textrue image dims(%d x %d) MUST match Input Dims \n", texture->width, texture->height);
     return IEL_ERR_DIMENSION;
   }
-  const size_t n = pixel_count(input);
   unsigned char* dst = output->buffer;
-  for (size_t i = 0; i < n; ++i) {
-    uint32_t tp;
-    std::memcpy(&tp, texture->buffer + 4 * i, 4);
-    const int t = static_cast<int>(tp & 0xFF);
-    const int s = dst[3 * i];
-    const int v = (s * s + (t - 15) * (255 - s)) / 255;
-    std::memset(dst + 3 * i, clampi(v, 0, 255), 3);
-  }
+  const size_t row = static_cast<size_t>(input->width);
+  px_for_rows(input->height, [&](int y0, int y1) {
+    for (size_t i = y0 * row; i < y1 * row; ++i) {
+      uint32_t tp;
+      std::memcpy(&tp, texture->buffer + 4 * i, 4);
+      const int t = static_cast<int>(tp & 0xFF);
+      const int s = dst[3 * i];
+      const int v = (s * s + (t - 15) * (255 - s)) / 255;
+      std::memset(dst + 3 * i, clampi(v, 0, 255), 3);
+    }
+  });
   return IEL_OK;
 }
 

@@ -3,9 +3,10 @@
 
 #include "iel.h"
 
-// Blurs the RGB of ARGB pixels with a Gaussian-looking kernel reaching
-// `radius` pixels on each side (0 or less: a copy); alpha kept; output may be
-// the input. 0, or 1/3/4 from the image checks. A failed working allocation
+// Blurs the RGB of ARGB pixels with a Gaussian-looking kernel of sigma roughly
+// radius / 3 reaching `radius` pixels on each side up to radius 4 and at
+// most radius + 2 beyond (0 or less: a copy; above 300 as 300); alpha kept;
+// output may be the input. 0, or 1/3/4 from the image checks. A failed working allocation
 // logs "Failed to allocate \n" and also returns 0 (output not written).
 int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int radius);
 

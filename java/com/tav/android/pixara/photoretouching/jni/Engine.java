@@ -798,9 +798,10 @@ public final class Engine {
     public static native void destroyTiltShift();
 
     /**
-     * Out-focus blur of the whole picture at level 0..7 (radius 3, 7, 15, 31,
-     * 41, 49, 55, 63 pixels; higher levels as 7, negative as 0). Returns
-     * SUCCESS, ERR_NULL or ERR_EFFECT.
+     * Out-focus blur of the whole picture at level 0..7 (a Gaussian-looking
+     * blur of radius 3, 7, 15, 31, 41, 49, 55, 63 pixels, sigma about a third
+     * of it; higher levels as 7, negative as 0). Returns SUCCESS, ERR_NULL or
+     * ERR_EFFECT.
      */
     public static native int applyOutfocusBlur(int[] in, int[] out, int width, int height, int level);
 
@@ -1109,7 +1110,10 @@ public final class Engine {
 
     /**
      * Preview of out-focus with the faster out-focus blur (strength 0..7:
-     * radius 3, 7, 15, 31, 41, 49, 55, 63 pixels), reduced into the preview.
+     * radius 3, 7, 15, 31, 41, 49, 55, 63 pixels). The photo is reduced
+     * first (nearest neighbour, the step of the other previews) and
+     * out-focused at the preview's scale: radius and faces divided by the
+     * step, the radius at least 1. It costs what it shows.
      *
      * @return SUCCESS, ERR_ALLOC, ERR_EFFECT (negative strength or the blur
      *         failed), or ERR_NULL
