@@ -188,15 +188,18 @@ void px_apply_vignette(int* in, int* out, int width, int height) {
 namespace {
 // Steps 1 to 8 of the vintage recipe: gamma curves and levels remappings per
 // channel with brightness and contrast between them.
-void vintage_tones(int* in, int* out, int w, int h) {
+// The steps around the brightness step work on each channel alone, so the
+// fast path composes each group into one map per channel.
+void vintage_tones_before(int* in, int* out, int w, int h) {
   control_gamma(in, out, w, h, 0, 0.77);
   changeHistogramByInput(out, out, w, h, 1, 28, 255);
   control_gamma(out, out, w, h, 1, 1.09);
   control_gamma(out, out, w, h, 2, 1.06);
   control_gamma(out, out, w, h, 3, 1.15);
   changeHistogramByOutput(out, out, w, h, 3, 45, 255);
-  px_control_brightness_all(out, out, w, h, 12);
-  px_control_contrast_all(out, out, w, h, 12);
+}
+void vintage_tones_after(int* in, int* out, int w, int h) {
+  px_control_contrast_all(in, out, w, h, 12);
   changeHistogramByInput(out, out, w, h, 0, 15, 243);
   control_gamma(out, out, w, h, 0, 1.03);
   changeHistogramByOutput(out, out, w, h, 0, 0, 238);
@@ -211,7 +214,11 @@ void vintage_tones(int* in, int* out, int w, int h) {
   changeHistogramByOutput(out, out, w, h, 3, 0, 241);
   changeHistogramByOutput(out, out, w, h, 3, 14, 255);
 }
-}  // namespace
+void vintage_tones(int* in, int* out, int w, int h) {
+  vintage_tones_before(in, out, w, h);
+  px_control_brightness_all(out, out, w, h, 12);
+  vintage_tones_after(out, out, w, h);
+}}  // namespace
 
 namespace {
 // The vintage colours in one pass: the per-channel steps before and after
@@ -222,30 +229,8 @@ struct VintageMaps {
 };
 VintageMaps vintage_maps() {
   VintageMaps m;
-  m.before = channel_maps_of([](int* in, int* out, int w, int h) {
-    control_gamma(in, out, w, h, 0, 0.77);
-    changeHistogramByInput(out, out, w, h, 1, 28, 255);
-    control_gamma(out, out, w, h, 1, 1.09);
-    control_gamma(out, out, w, h, 2, 1.06);
-    control_gamma(out, out, w, h, 3, 1.15);
-    changeHistogramByOutput(out, out, w, h, 3, 45, 255);
-  });
-  m.after = channel_maps_of([](int* in, int* out, int w, int h) {
-    px_control_contrast_all(in, out, w, h, 12);
-    changeHistogramByInput(out, out, w, h, 0, 15, 243);
-    control_gamma(out, out, w, h, 0, 1.03);
-    changeHistogramByOutput(out, out, w, h, 0, 0, 238);
-    changeHistogramByInput(out, out, w, h, 1, 49, 255);
-    control_gamma(out, out, w, h, 1, 2.35);
-    changeHistogramByOutput(out, out, w, h, 1, 11, 232);
-    control_gamma(out, out, w, h, 2, 1.15);
-    changeHistogramByOutput(out, out, w, h, 2, 0, 250);
-    control_gamma(out, out, w, h, 3, 0.58);
-    changeHistogramByOutput(out, out, w, h, 3, 56, 238);
-    px_control_contrast_all(out, out, w, h, 12);
-    changeHistogramByOutput(out, out, w, h, 3, 0, 241);
-    changeHistogramByOutput(out, out, w, h, 3, 14, 255);
-  });
+  m.before = channel_maps_of(vintage_tones_before);
+  m.after = channel_maps_of(vintage_tones_after);
   return m;
 }
 }  // namespace
