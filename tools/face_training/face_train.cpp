@@ -687,6 +687,13 @@ int main(int argc, char** argv) {
         write_model(out + name, sp, variant, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0", "uint8_t",
                     "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
       }
+    // The written table keeps FACE_FINAL_KEEP of the calibration windows at
+    // the last stage (chosen on the real validation photos); the last stage is
+    // trained and bootstrapped at the keep rate of FACE_KEEP.
+    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.85);
+    if (finalKeep != sp.keep.back())
+      cascade.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, finalKeep);
+    std::fprintf(report, "face table written with the last stage keeping %g of the calibration windows\n", finalKeep);
     write_model(out + "/frontal_model.inc", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
                 "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
   }
