@@ -690,7 +690,7 @@ int main(int argc, char** argv) {
     // The written table keeps FACE_FINAL_KEEP of the calibration windows at
     // the last stage (chosen on the real validation photos); the last stage is
     // trained and bootstrapped at the keep rate of FACE_KEEP.
-    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.85);
+    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.80);
     if (finalKeep != sp.keep.back())
       cascade.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, finalKeep);
     std::fprintf(report, "face table written with the last stage keeping %g of the calibration windows\n", finalKeep);
