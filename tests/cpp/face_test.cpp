@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <random>
 #include <string>
@@ -366,4 +367,70 @@ TEST(FaceEngine, FindsTheAstronautAndNothingInTheCoffee) {
   RunFaceAnalyzer(&info, argb.data(), w, h);
   EXPECT_EQ(info.faceCount, 0);
   ReleaseFaceBeautyPlus(&info);
+}
+
+namespace {
+double box_iou(const caFaceBox& a, int l, int t, int r, int b) {
+  const double ix = std::max(0, std::min(a.x + a.width, r) - std::max(a.x, l));
+  const double iy = std::max(0, std::min(a.y + a.height, b) - std::max(a.y, t));
+  const double in = ix * iy;
+  return in / (double(a.width) * a.height + double(r - l) * (b - t) - in);
+}
+}  // namespace
+
+// The astronaut photo pasted unscaled into larger canvases (tiled coffee
+// photo, mirrored every other tile, with seeded noise) so that the analyser's
+// 640-pixel working image shows her face at each width band from about 35 to
+// 170 pixels. The face is found in every band, once, and its box is the usual
+// face box: brows to chin and cheek to cheek as annotated on real photos,
+// (79, 26) to (145, 97) in the 256-pixel photo, covered at IoU >= 0.5.
+TEST(FaceEngine, FindsTheAstronautAtEveryFaceWidthWithTheUsualBox) {
+  int aw = 0, ah = 0, cw = 0, ch = 0;
+  const std::vector<unsigned char> astro = read_pgm("astronaut_256.pgm", &aw, &ah);
+  const std::vector<unsigned char> coffee = read_pgm("coffee_256.pgm", &cw, &ch);
+  ASSERT_FALSE(astro.empty());
+  ASSERT_FALSE(coffee.empty());
+  std::mt19937 rng(15);
+  struct Case {
+    int width, height, atX, atY;
+  };
+  // Working face widths about 170, 110, 80, 55, 40 and 35 pixels.
+  for (const Case& c : {Case{256, 256, 0, 0}, Case{397, 301, 77, 45}, Case{535, 333, 200, 60},
+                        Case{777, 512, 333, 101}, Case{1061, 700, 601, 313}, Case{1225, 901, 17, 600}}) {
+    std::vector<int> argb(static_cast<size_t>(c.width) * c.height);
+    for (int y = 0; y < c.height; ++y)
+      for (int x = 0; x < c.width; ++x) {
+        const int tx = x / cw, ty = y / ch;
+        const int sx = (tx + ty) % 2 ? cw - 1 - x % cw : x % cw;
+        int g = coffee[(y % ch) * cw + sx] + static_cast<int>(rng() % 9) - 4;
+        if (x >= c.atX && y >= c.atY && x < c.atX + aw && y < c.atY + ah) g = astro[(y - c.atY) * aw + x - c.atX];
+        g = std::clamp(g, 0, 255);
+        argb[static_cast<size_t>(y) * c.width + x] = static_cast<int>(0xFF000000u | g * 0x010101u);
+      }
+    FaceEngineInfo info{};
+    ASSERT_EQ(InitFaceBeautyPlus(&info, 1, 5, 1, 0, 2, 0), 1);
+    RunFaceAnalyzer(&info, argb.data(), c.width, c.height);
+    const int workingFace = 66 * 640 / std::max(c.width, c.height);
+    int best = -1;
+    double bestIou = 0;
+    for (int i = 0; i < info.faceCount; ++i) {
+      const double v = box_iou(info.faceRect[i], c.atX + 79, c.atY + 26, c.atX + 145, c.atY + 97);
+      if (v > bestIou) bestIou = v, best = i;
+    }
+    EXPECT_GE(bestIou, 0.5) << "face about " << workingFace << " px wide at the working size, " << info.faceCount
+                            << " faces";
+    if (best >= 0) {
+      // Both eyes found, in the upper half of the box, left of and right of its middle.
+      const caFaceBox& f = info.faceRect[best];
+      const caEyePair& e = info.eyePoints[best];
+      EXPECT_EQ(info.eyeValid[best], 1);
+      EXPECT_GE(e.x1, c.atX + 90) << workingFace;
+      EXPECT_LE(e.x1, c.atX + 112) << workingFace;
+      EXPECT_GE(e.x2, c.atX + 114) << workingFace;
+      EXPECT_LE(e.x2, c.atX + 134) << workingFace;
+      EXPECT_LT(e.y1, f.y + f.height / 2) << workingFace;
+      EXPECT_LT(e.y2, f.y + f.height / 2) << workingFace;
+    }
+    ReleaseFaceBeautyPlus(&info);
+  }
 }

@@ -13,7 +13,10 @@
 #include <opencv2/imgcodecs.hpp>
 #include <opencv2/imgproc.hpp>
 #include <opencv2/objdetect.hpp>
+#include <fstream>
+#include <map>
 #include <random>
+#include <sstream>
 
 #include "common.h"
 #include "effect/face/face_engine.h"
@@ -94,6 +97,180 @@ std::vector<cv::Rect2d> run_cv(cv::CascadeClassifier& c, const cv::Mat& bgr) {
   c.detectMultiScale(g, f, 1.1, 3, 0, cv::Size(20, 20));
   return std::vector<cv::Rect2d>(f.begin(), f.end());
 }
+
+// Whole real photos with annotated face boxes (the usual box: brows to chin,
+// cheek to cheek): recall at IoU 0.3 and 0.5, false positives (detections
+// matching no face at IoU 0.3), recall by face width at the analyser's
+// 640-pixel working size, median IoU of the faces found, and how the found
+// boxes sit against the annotated ones. A validation set only: nothing here
+// feeds the training.
+struct RealTally {
+  int faces = 0, found3 = 0, found5 = 0, fp = 0;
+  static constexpr int kBins = 5;
+  static constexpr int kEdges[kBins - 1] = {30, 45, 60, 100};  // face width at the working size
+  int binFaces[kBins] = {}, binFound3[kBins] = {}, binFound5[kBins] = {};
+  std::vector<double> ious;                   // IoU of each face found at 0.3
+  double widthRatio = 0, dx = 0, dy = 0, heightRatio = 0;  // detected against annotated, over the found faces
+  double seconds = 0;
+  std::vector<std::string> missed;            // photo and box of faces not found at 0.3
+  static int bin(double w) {
+    int b = 0;
+    while (b < kBins - 1 && w >= kEdges[b]) ++b;
+    return b;
+  }
+  // Greedy matching, each face to its best unused detection at the given IoU.
+  static std::vector<int> match(const std::vector<cv::Rect2d>& truth, const std::vector<cv::Rect2d>& det, double at) {
+    std::vector<int> m(truth.size(), -1);
+    std::vector<bool> used(det.size());
+    for (size_t t = 0; t < truth.size(); ++t) {
+      double bi = at;
+      for (size_t k = 0; k < det.size(); ++k)
+        if (!used[k] && iou(truth[t], det[k]) >= bi) bi = iou(truth[t], det[k]), m[t] = k;
+      if (m[t] >= 0) used[m[t]] = true;
+    }
+    return m;
+  }
+  void add(const std::string& photo, const std::vector<cv::Rect2d>& truth, const std::vector<cv::Rect2d>& det,
+           double working) {
+    std::vector<int> m3 = match(truth, det, 0.3), m5 = match(truth, det, 0.5);
+    std::vector<bool> used(det.size());
+    faces += truth.size();
+    for (size_t t = 0; t < truth.size(); ++t) {
+      const int b = bin(truth[t].width * working);
+      ++binFaces[b];
+      if (m5[t] >= 0) ++found5, ++binFound5[b];
+      if (m3[t] < 0) {
+        char buf[128];
+        std::snprintf(buf, sizeof buf, "%s %.0f %.0f %.0f %.0f", photo.c_str(), truth[t].x, truth[t].y,
+                      truth[t].x + truth[t].width, truth[t].y + truth[t].height);
+        missed.push_back(buf);
+        continue;
+      }
+      const cv::Rect2d& d = det[m3[t]];
+      used[m3[t]] = true;
+      ++found3, ++binFound3[b];
+      ious.push_back(iou(truth[t], d));
+      widthRatio += d.width / truth[t].width;
+      heightRatio += d.height / truth[t].height;
+      dx += (d.x + d.width / 2 - truth[t].x - truth[t].width / 2) / truth[t].width;
+      dy += (d.y + d.height / 2 - truth[t].y - truth[t].height / 2) / truth[t].width;
+    }
+    for (bool u : used) fp += !u;
+  }
+  double median_iou() const {
+    if (ious.empty()) return 0;
+    std::vector<double> v = ious;
+    std::sort(v.begin(), v.end());
+    return v[v.size() / 2];
+  }
+};
+
+std::map<std::string, std::vector<cv::Rect2d>> real_boxes(const std::string& dir) {
+  std::map<std::string, std::vector<cv::Rect2d>> boxes;
+  std::ifstream in(dir + "/boxes.txt");
+  std::string line;
+  while (std::getline(in, line)) {
+    if (line.empty() || line[0] == '#') continue;
+    std::istringstream ss(line);
+    std::string photo;
+    double l, t, r, b;
+    if (ss >> photo >> l >> t >> r >> b) boxes[photo].emplace_back(l, t, r - l, b - t);
+  }
+  return boxes;
+}
+
+// Each real photo with its annotated boxes (green) and the mode 1 faces
+// (red, eyes and mouth as small crosses), for looking at.
+void draw_real(const std::string& data, const std::string& out) {
+  const std::string dir = data + "/real-photo-faces";
+  for (const auto& [photo, truth] : real_boxes(dir)) {
+    cv::Mat bgr = cv::imread(dir + "/photos/" + photo, cv::IMREAD_COLOR);
+    if (bgr.empty()) continue;
+    FaceEngineInfo info{};
+    run_engine(bgr, 1, &info);
+    for (const cv::Rect2d& t : truth) cv::rectangle(bgr, t, cv::Scalar(0, 200, 0), 1);
+    for (int i = 0; i < info.faceCount; ++i) {
+      const caFaceBox& f = info.faceRect[i];
+      cv::rectangle(bgr, cv::Rect(f.x, f.y, f.width, f.height), cv::Scalar(0, 0, 255), 1);
+      const caEyePair& e = info.eyePoints[i];
+      if (e.x1 >= 0) {
+        cv::drawMarker(bgr, cv::Point(e.x1, e.y1), cv::Scalar(255, 200, 0), cv::MARKER_CROSS, 5);
+        cv::drawMarker(bgr, cv::Point(e.x2, e.y2), cv::Scalar(255, 200, 0), cv::MARKER_CROSS, 5);
+      }
+      if (info.mouthRect[i].width > 0)
+        cv::drawMarker(bgr, cv::Point(info.mouthCenter[i].x, info.mouthCenter[i].y), cv::Scalar(255, 0, 255),
+                       cv::MARKER_CROSS, 5);
+    }
+    ReleaseFaceBeautyPlus(&info);
+    cv::imwrite(out + "/" + photo.substr(0, photo.rfind('.')) + ".png", bgr);
+  }
+}
+
+void real_eval(const std::string& data, const std::string& cvdir) {
+  const std::string dir = data + "/real-photo-faces";
+  std::map<std::string, std::vector<cv::Rect2d>> boxes = real_boxes(dir);
+  if (boxes.empty()) {
+    std::printf("no %s/boxes.txt: real photos not measured\n", dir.c_str());
+    return;
+  }
+  // Photos without faces are listed too when they exist (none annotated).
+  for (const std::string& p : list_images(dir + "/photos")) boxes[p.substr(dir.size() + 8)];
+  struct Det {
+    const char* name;
+    int mode;  // engine mode, or 0 for an OpenCV cascade
+    cv::CascadeClassifier cascade;
+    RealTally tally;
+  };
+  std::vector<Det> dets;
+  dets.push_back({"engine, upright (mode 1)", 1, {}, {}});
+  dets.push_back({"engine, upright and +-45 (mode 3)", 3, {}, {}});
+  for (const char* c : {"haarcascades/haarcascade_frontalface_default.xml", "haarcascades/haarcascade_frontalface_alt2.xml",
+                        "lbpcascades/lbpcascade_frontalface.xml"}) {
+    Det d{c, 0, {}, {}};
+    if (std::getenv("FACE_EVAL_NO_CV") || !d.cascade.load(cvdir + "/" + c)) continue;
+    dets.push_back(std::move(d));
+  }
+  int photos = 0;
+  // FACE_EVAL_REAL_LIST=1: every missed face and every false positive of mode 1.
+  const bool list = std::getenv("FACE_EVAL_REAL_LIST") != nullptr;
+  for (const auto& [photo, truth] : boxes) {
+    cv::Mat bgr = cv::imread(dir + "/photos/" + photo, cv::IMREAD_COLOR);
+    if (bgr.empty()) continue;
+    ++photos;
+    const double working = 640.0 / std::max(bgr.cols, bgr.rows);
+    for (Det& d : dets) {
+      const double t0 = now();
+      std::vector<cv::Rect2d> found = d.mode ? run_engine(bgr, d.mode) : run_cv(d.cascade, bgr);
+      d.tally.seconds += now() - t0;
+      const int fp0 = d.tally.fp;
+      d.tally.add(photo, truth, found, working);
+      if (list && d.mode == 1 && d.tally.fp > fp0) std::printf("  false positives in %s: %d\n", photo.c_str(), d.tally.fp - fp0);
+    }
+  }
+  std::printf("Real photos: %d photos, %d annotated faces (validation set; OpenCV detectMultiScale(grey, 1.1, 3, 0, "
+              "20 x 20) on the photo as it is)\n",
+              photos, dets.empty() ? 0 : dets[0].tally.faces);
+  std::printf("| detector | recall IoU>=0.3 | recall IoU>=0.5 | false positives | median IoU | ms per photo | found at "
+              "0.3 (0.5) by face width at 640: <30 / 30-45 / 45-60 / 60-100 / >=100 |\n|---|---|---|---|---|---|---|\n");
+  for (const Det& d : dets) {
+    const RealTally& t = d.tally;
+    std::printf("| %s | %.3f (%d) | %.3f (%d) | %d | %.3f | %.1f |", d.name, double(t.found3) / std::max(1, t.faces),
+                t.found3, double(t.found5) / std::max(1, t.faces), t.found5, t.fp, t.median_iou(),
+                1000 * t.seconds / std::max(1, photos));
+    for (int b = 0; b < RealTally::kBins; ++b)
+      std::printf("%s%d (%d) / %d", b ? ", " : " ", t.binFound3[b], t.binFound5[b], t.binFaces[b]);
+    std::printf(" |\n");
+  }
+  std::printf("found boxes against the annotated ones (mean over faces found at 0.3): width, height ratio; centre "
+              "offset in annotated widths\n");
+  for (const Det& d : dets) {
+    const RealTally& t = d.tally;
+    const int n = std::max(1, t.found3);
+    std::printf("  %s: %.3f, %.3f; (%.3f, %.3f)\n", d.name, t.widthRatio / n, t.heightRatio / n, t.dx / n, t.dy / n);
+  }
+  if (list)
+    for (const std::string& m : dets[0].tally.missed) std::printf("  missed by mode 1: %s\n", m.c_str());
+}
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -102,6 +279,10 @@ int main(int argc, char** argv) {
     double k = std::atof(argv[4]) / std::max(g.cols, g.rows);
     cv::resize(g, g, cv::Size(), k, k, cv::INTER_AREA);
     return cv::imwrite(argv[3], g) ? 0 : 1;
+  }
+  if (argc == 4 && std::string(argv[1]) == "--draw") {  // face_eval --draw DATA_DIR OUT_DIR: the real photos with boxes
+    draw_real(argv[2], argv[3]);
+    return 0;
   }
   if (argc < 2) {
     std::fprintf(stderr, "usage: face_eval DATA_DIR [OPENCV_DATA_DIR]\n");
@@ -135,6 +316,9 @@ int main(int argc, char** argv) {
   bool haveCv = !quick && haar.load(cvdir + "/haarcascades/haarcascade_frontalface_default.xml") &&
                 lbp.load(cvdir + "/lbpcascades/lbpcascade_frontalface_improved.xml");
 
+  // FACE_EVAL_REAL_ONLY=1: only the real photos.
+  if (!std::getenv("FACE_EVAL_LANDMARKS_ONLY")) real_eval(data, cvdir);
+  if (std::getenv("FACE_EVAL_REAL_ONLY")) return 0;
   // Composite photos from the held-out scenes (every fifth) and faces.
   Tally eng, engRot, th, tl, sceneOnly, haarOnly, lbpOnly;
   size_t next = 0;

@@ -62,6 +62,7 @@ struct Spec {
   // larger scale ranks neighbouring windows more finely; 0 keeps the byte-like
   // scale of the other stages.
   double lastScale = 0;
+  int lastRounds = 0;          // bootstrapping rounds of the last stage
 };
 
 struct Stage {
@@ -371,6 +372,30 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const Sa
     }
     RawStage raw = train_raw(sp, k, pos, res.s);
     cascade.push_back(quantise(sp, k, raw, cal, sp.keep[k]));
+    // Bootstrapping rounds of the last stage: the windows that still pass the
+    // whole cascade are added to the stage's negatives and the stage is
+    // trained again, while their share keeps falling.
+    for (int round = 0; k + 1 == sp.features.size() && round < sp.lastRounds; ++round) {
+      Reservoir hard{cap / 2, {}, 0};
+      hard.s.P = allPos.P;
+      size_t scanned = 0;
+      for (const Level& L : levels)
+        for (int y = 0; y < L.h - sp.wh; y += ystep)
+          for (int x = 0; x < L.w - sp.ww; ++x) {
+            const int copies = negOk(L, x, y, k);
+            if (!copies) continue;
+            ++scanned;
+            if (cascade_window(cascade, sp, L.mct.data(), L.w, x, y))
+              for (int c = 0; c < copies; ++c) hard.offer(sp, L.mct.data(), L.w, x, y);
+          }
+      std::fprintf(report, "  round %d: %zu of %zu windows pass the cascade (%.2e)\n", round + 1, hard.seen, scanned,
+                   scanned ? double(hard.seen) / scanned : 0.0);
+      std::fflush(report);
+      if (hard.s.size() < 100) break;
+      res.s.codes.insert(res.s.codes.end(), hard.s.codes.begin(), hard.s.codes.end());
+      raw = train_raw(sp, k, pos, res.s);
+      cascade.back() = quantise(sp, k, raw, cal, sp.keep[k]);
+    }
     if (k + 1 == sp.features.size() && sweep) *sweep = Sweep{raw, cal};
     size_t kept = 0, calKept = 0;
     for (size_t i = 0; i < allPos.size(); ++i) kept += cascade_row(cascade, allPos.row(i));
@@ -397,20 +422,87 @@ std::vector<Stage> train_cascade(const Spec& sp, const Samples& allPos, const Sa
   return cascade;
 }
 
-// NN sampling of an aligned window through a similarity transform.
+// NN sampling of an aligned window through a similarity transform; stretch
+// != 1 widens (> 1) or narrows the face across, a crude slight yaw.
 void sample_window(const cv::Mat& g, double mx, double my, double angle, double s, double cx, double cy, int ww, int wh,
-                   std::vector<uint8_t>& out) {
+                   std::vector<uint8_t>& out, double stretch = 1) {
   out.resize(ww * wh);
   const double c = std::cos(angle) * s, sn = std::sin(angle) * s;
   for (int v = 0; v < wh; ++v)
     for (int u = 0; u < ww; ++u) {
-      double du = u - cx, dv = v - cy;
+      double du = (u - cx) / stretch, dv = v - cy;
       int sx = static_cast<int>(std::floor(mx + c * du - sn * dv + 0.5));
       int sy = static_cast<int>(std::floor(my + sn * du + c * dv + 0.5));
       sx = std::clamp(sx, 0, g.cols - 1);
       sy = std::clamp(sy, 0, g.rows - 1);
       out[v * ww + u] = g.at<uint8_t>(sy, sx);
     }
+}
+
+// What real photos do to a face, applied to a sampled window with the given
+// probability of each effect: low or high contrast and a brightness offset,
+// gamma, light from one side, blur, sensor noise, JPEG-like blocks (each
+// block pulled toward its mean, as coarse quantisation does), and the
+// rounding and clipping to bytes.
+struct Augment {
+  double contrast = 0.6, gamma = 0.5, side = 0.4, blur = 0.35, noise = 0.5, blocks = 0.2;
+};
+void augment(std::vector<uint8_t>& win, int ww, int wh, const Augment& a) {
+  const int n = ww * wh;
+  std::vector<double> v(win.begin(), win.end());
+  double mean = 0;
+  for (double x : v) mean += x;
+  mean /= n;
+  if (uni(0, 1) < a.contrast) {
+    const double k = std::exp(uni(std::log(0.4), std::log(1.5))), off = uni(-30, 30);
+    for (double& x : v) x = mean + off + k * (x - mean);
+  }
+  if (uni(0, 1) < a.gamma) {
+    const double gm = std::exp(uni(std::log(0.55), std::log(1.8)));
+    for (double& x : v) x = 255 * std::pow(std::clamp(x, 0.0, 255.0) / 255, gm);
+  }
+  if (uni(0, 1) < a.side) {
+    // Light falling off across the face in a random direction: a gain from
+    // 1 - depth on one side to 1 + depth on the other.
+    const double dir = uni(0, 2 * M_PI), depth = uni(0.1, 0.45);
+    const double cx = std::cos(dir) / ww, cy = std::sin(dir) / wh;
+    for (int y = 0; y < wh; ++y)
+      for (int x = 0; x < ww; ++x) v[y * ww + x] *= 1 + depth * 2 * ((x - ww / 2.0) * cx + (y - wh / 2.0) * cy);
+  }
+  if (uni(0, 1) < a.blur) {
+    const double t = uni(0.3, 1.0);  // share of a 1-2-1 blur
+    std::vector<double> b(n);
+    for (int y = 0; y < wh; ++y)
+      for (int x = 0; x < ww; ++x) {
+        double sum = 0, wsum = 0;
+        for (int dy = -1; dy <= 1; ++dy)
+          for (int dx = -1; dx <= 1; ++dx) {
+            const int xx = std::clamp(x + dx, 0, ww - 1), yy = std::clamp(y + dy, 0, wh - 1);
+            const double w = (2 - std::abs(dx)) * (2 - std::abs(dy));
+            sum += w * v[yy * ww + xx], wsum += w;
+          }
+        b[y * ww + x] = (1 - t) * v[y * ww + x] + t * sum / wsum;
+      }
+    v.swap(b);
+  }
+  if (uni(0, 1) < a.blocks) {
+    const int bs = uni(0, 1) < 0.5 ? 3 : 4;
+    const double t = uni(0.3, 0.8), ox = std::floor(uni(0, bs)), oy = std::floor(uni(0, bs));
+    for (int by = -static_cast<int>(oy); by < wh; by += bs)
+      for (int bx = -static_cast<int>(ox); bx < ww; bx += bs) {
+        double sum = 0;
+        int cnt = 0;
+        for (int y = std::max(0, by); y < std::min(wh, by + bs); ++y)
+          for (int x = std::max(0, bx); x < std::min(ww, bx + bs); ++x) sum += v[y * ww + x], ++cnt;
+        for (int y = std::max(0, by); y < std::min(wh, by + bs); ++y)
+          for (int x = std::max(0, bx); x < std::min(ww, bx + bs); ++x) v[y * ww + x] += t * (sum / cnt - v[y * ww + x]);
+      }
+  }
+  if (uni(0, 1) < a.noise) {
+    std::normal_distribution<double> nd(0, uni(1, 5));
+    for (double& x : v) x += nd(rng);
+  }
+  for (int i = 0; i < n; ++i) win[i] = static_cast<uint8_t>(std::clamp(std::lround(v[i]), 0L, 255L));
 }
 
 cv::Mat flip(const cv::Mat& g) {
@@ -494,15 +586,21 @@ int main(int argc, char** argv) {
 
   if (doFace) {
     Spec sp{"face", 22, 24, {}, {}, {24, 50, 170, 440}, {1609, 1942, 2904, 7122}, 255,
-            env_list("FACE_KEEP", {0.9995, 0.9995, 0.999, 0.90}), env_num("FACE_EPS", 10),
-            env_num("FACE_LAST_NEG", 5)};
+            env_list("FACE_KEEP", {0.999, 0.999, 0.998, 0.90}), env_num("FACE_EPS", 10),
+            env_num("FACE_LAST_NEG", 8)};
+    sp.lastRounds = static_cast<int>(env_num("FACE_ROUNDS", 1));
     for (int y = 1; y <= 22; ++y)
       for (int x = 1; x <= 20; ++x) sp.px.push_back(x), sp.py.push_back(y);
     // Positive windows: each face aligned by its eyes, mirrored, several
     // copies with random scale (about one pyramid step), roll and shift.
     const std::vector<double> scaleRange = env_list("FACE_SCALE", {0.87, 1.15});
-    const double shift = env_num("FACE_SHIFT", 1.5), rollRange = env_num("FACE_ROLL", 0.17);
-    const int copies = static_cast<int>(env_num("FACE_COPIES", 2));
+    const double shift = env_num("FACE_SHIFT", 1.2), rollRange = env_num("FACE_ROLL", 0.17);
+    const int copies = static_cast<int>(env_num("FACE_COPIES", 3));
+    // FACE_AUG: scale of every augmentation probability (0: clean copies only);
+    // FACE_YAW: largest stretch across (1.1: the face 10 % wider or narrower).
+    const double augScale = env_num("FACE_AUG", 0.6), yaw = env_num("FACE_YAW", 1.1);
+    Augment aug;
+    for (double* q : {&aug.contrast, &aug.gamma, &aug.side, &aug.blur, &aug.noise, &aug.blocks}) *q *= augScale;
     std::fprintf(report, "face: keep %g %g %g %g, eps %g, scale %g..%g, shift %g, roll %g, %d copies\n", sp.keep[0],
                  sp.keep[1], sp.keep[2], sp.keep[3], sp.eps, scaleRange[0], scaleRange[1], shift, rollRange, copies);
     Samples trainPos, calPos;
@@ -525,8 +623,10 @@ int main(int argc, char** argv) {
           double scale = std::exp(uni(std::log(scaleRange[0]), std::log(scaleRange[1])));
           double roll = uni(-rollRange, rollRange);
           double s = d / kEyeDist * scale;
+          const double stretch = std::exp(uni(-std::log(yaw), std::log(yaw)));
           sample_window(g, (p.lx + p.rx) / 2, (p.ly + p.ry) / 2, a + roll, s, kEyeMidX + uni(-shift, shift),
-                        kEyeMidY + uni(-shift, shift), 22, 24, win);
+                        kEyeMidY + uni(-shift, shift), 22, 24, win, stretch);
+          if (augScale > 0) augment(win, 22, 24, aug);
           std::fill(mct.begin(), mct.end(), 0);
           image2MCT_FD(win.data(), 22, 24, mct.data());
           add_window(pos, sp, mct.data(), 22, 0, 0);
@@ -543,9 +643,12 @@ int main(int argc, char** argv) {
     // Share of the training wallpapers used (FACE_WALLPAPERS, tenths).
     // The scenes turned by +-45 degrees, as the turned passes see them (FACE_TURNED=0: upright only).
     const bool turnedNegatives = env_num("FACE_TURNED", 1) != 0;
+    // Negatives from every face-free photo (FACE_ALL_SCENES=0: without the
+    // fifth that the composites of face_eval are made of, as before).
+    const bool allScenes = env_num("FACE_ALL_SCENES", 1) != 0;
     const int wallTenths = static_cast<int>(std::lround(10 * env_num("FACE_WALLPAPERS", 1.0)));
     for (size_t i = 0, w = 0; i < scenes.size(); ++i) {
-      if (is_held_out_scene(i < sceneCount ? i : i - sceneCount)) continue;
+      if (!allScenes && is_held_out_scene(i < sceneCount ? i : i - sceneCount)) continue;
       if (i >= sceneCount && static_cast<int>(w++ % 10) >= wallTenths) continue;
       wallpapers += i >= sceneCount;
       cv::Mat g = load_grey(scenes[i]);
@@ -584,6 +687,13 @@ int main(int argc, char** argv) {
         write_model(out + name, sp, variant, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0", "uint8_t",
                     "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
       }
+    // The written table keeps FACE_FINAL_KEEP of the calibration windows at
+    // the last stage (chosen on the real validation photos); the last stage is
+    // trained and bootstrapped at the keep rate of FACE_KEEP.
+    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.80);
+    if (finalKeep != sp.keep.back())
+      cascade.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, finalKeep);
+    std::fprintf(report, "face table written with the last stage keeping %g of the calibration windows\n", finalKeep);
     write_model(out + "/frontal_model.inc", sp, cascade, "uint8_t", "m_nFrontalMCTFeatureX0", "m_nFrontalMCTFeatureY0",
                 "uint8_t", "m_nFrontalMCTAlpha", "face windows from MTFL training faces, negatives from scene photos");
   }
