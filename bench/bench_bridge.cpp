@@ -71,7 +71,7 @@ BRIDGE_BENCH(applyVintage, JNI_FN(applyVintage)(PIC));
 BRIDGE_BENCH(controlBrightness, JNI_FN(controlBrightness)(REGION(14, whole)));
 BRIDGE_BENCH(controlSaturation, JNI_FN(controlSaturation)(REGION(16, whole)));
 BRIDGE_BENCH(controlSaturationMasked, JNI_FN(controlSaturation)(REGION(16, full)));
-BRIDGE_BENCH(controlHue, JNI_FN(controlHue)(REGION(60, whole)));
+BRIDGE_BENCH(controlHue, JNI_FN(controlHue)(REGION(7, whole)));  // a turn of 126 degrees
 BRIDGE_BENCH(applyAutoAdjust, JNI_FN(applyAutoAdjust)(PIC));
 BRIDGE_BENCH(applyPointColorRed, JNI_FN(applyPointColorRed)(PIC));
 BRIDGE_BENCH(applyRetro, JNI_FN(applyRetro)(PIC));

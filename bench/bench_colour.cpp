@@ -16,7 +16,8 @@ constexpr px_rect kWhole{0, -1, 0, -1};
   BENCHMARK(name)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 COLOUR_BENCH(Memcpy, std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4))
-COLOUR_BENCH(Hue, px_control_hue(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 60, kWhole))
+// Level 7: a turn of 126 degrees (levels past 20 turn more than two circles and copy).
+COLOUR_BENCH(Hue, px_control_hue(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 7, kWhole))
 COLOUR_BENCH(Hue100, px_control_hue_range100(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 70, kWhole))
 COLOUR_BENCH(AdjustRGB,
              px_adjust_RGB(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 14, 10, 7, kWhole))

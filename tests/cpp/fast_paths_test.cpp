@@ -4,6 +4,7 @@
 // and the replaced divisions checked over every value they can meet.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <cstring>
 #include <functional>
@@ -368,6 +369,31 @@ TEST(RegionOpsFast, HueOverTheColourCube) {
           Pic(cube.size()), [&](Pic& o) { hue(cube.data(), nullptr, o.data(), w, h, level, whole); },
           label("hue ", level));
     }
+  }
+}
+
+// Hue's table of turned hues against the plain conversions for every colour
+// of the cube (each alpha kept), on two turns of each scale: sector edges,
+// the greys, v = 255 and the colours whose hue rounds up to 360.
+TEST(RegionOpsFast, HueTurnsEveryColourAsThePlainPath) {
+  const int w = 4096, h = 4096;
+  Pic cube(static_cast<size_t>(w) * h);
+  for (uint32_t c = 0; c < cube.size(); ++c) cube[c] = static_cast<int>((c * 0x9E3779B9u & 0xFF000000u) | c);
+  const px_rect whole{0, -1, 0, -1};
+  // The first colour that differs, rather than 16 M pixels.
+  const auto first_difference = [&](const Pic& a, const Pic& b) {
+    const auto at = std::mismatch(a.begin(), a.end(), b.begin());
+    return at.first == a.end() ? std::string("none") : label(std::hex, cube[static_cast<size_t>(at.first - a.begin())]);
+  };
+  for (int level : {13, 77}) {
+    auto [fast, plain] =
+        both_paths(Pic(cube.size()), [&](Pic& o) { hue100(cube.data(), nullptr, o.data(), w, h, level, whole); });
+    EXPECT_EQ(first_difference(fast, plain), "none") << "hue100 " << level;
+  }
+  for (int level : {-3, 7}) {
+    auto [fast, plain] =
+        both_paths(Pic(cube.size()), [&](Pic& o) { hue(cube.data(), nullptr, o.data(), w, h, level, whole); });
+    EXPECT_EQ(first_difference(fast, plain), "none") << "hue " << level;
   }
 }
 

@@ -55,15 +55,58 @@ struct HueShift {
   }
 };
 
-// HueShift with the two HSV conversions written out inline, the same
-// arithmetic step for step, so the per-pixel work needs no calls.
+// HueShift by a table of the 361 hues a pixel can have. A turn keeps a
+// pixel's value v (its largest channel) and lo = v (1 - s) in the channels
+// the turned sector gives them; only the third channel depends on the turned
+// hue, through f (its place in the sector): q = v (1 - s f) or
+// u = v (1 - s (1 - f)). So each hue's entry holds the sector's placement of
+// v, lo and that channel and the f term it uses, all worked out by the plain
+// conversion's own steps; per pixel remain the hue, s and two products.
+struct HueTurn {
+  uint32_t keep;              // all ones: the turned hue is in no sector
+  uint32_t sv, sm, sl;        // shifts placing v, the third channel and lo
+  int32_t f4;                 // f >> 4 (q) or (65536 - f) >> 4 (u)
+};
+using HueTurnTable = std::array<HueTurn, 361>;
+
 inline int32_t wrap_mul(int32_t a, int32_t b) {
   return static_cast<int32_t>(static_cast<uint32_t>(a) * static_cast<uint32_t>(b));
 }
 
-struct HueShiftInline {
-  int shift;
-  uint32_t operator()(uint32_t p) const {
+HueTurnTable hue_turn_table(int shift) {
+  HueTurnTable t{};
+  for (int h = 0; h <= 360; ++h) {
+    int h2 = static_cast<int>(static_cast<uint32_t>(h) + static_cast<uint32_t>(shift));
+    if (h2 < 0) {
+      h2 += 360;
+    } else if (h2 > 359) {
+      h2 -= 360;
+    }
+    const int sector = hue_sector(h2);
+    HueTurn& e = t[static_cast<size_t>(h)];
+    if (sector < 0 || sector > 5) {
+      e = {~0u, 0, 0, 0, 0};
+      continue;
+    }
+    const int f = h2 == 360 ? 0 : wrap_mul(h2, 1092) - (sector << 16);
+    const int32_t q = f >> 4, u = (65536 - f) >> 4;
+    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q.
+    switch (sector) {
+      case 0: e = {0, 16, 8, 0, u}; break;
+      case 1: e = {0, 8, 16, 0, q}; break;
+      case 2: e = {0, 8, 0, 16, u}; break;
+      case 3: e = {0, 0, 8, 16, q}; break;
+      case 4: e = {0, 0, 16, 8, u}; break;
+      default: e = {0, 16, 0, 8, q}; break;
+    }
+  }
+  return t;
+}
+
+struct HueShiftTable {
+  const HueTurn* turn;
+  // Inlined into the pixel loop (the compilers otherwise call it per pixel).
+  [[gnu::always_inline]] uint32_t operator()(uint32_t p) const {
     const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
               b = static_cast<int>(p & 255);
     int v = r > g ? r : g;
@@ -71,27 +114,23 @@ struct HueShiftInline {
     int min = r < g ? r : g;
     min = b < min ? b : min;
     const int delta = v - min;
+    // delta > 0 exactly when s > 0 (65536 / v >= 257).
     const int s = static_cast<int>(LUT_DELTA[v & 255] * static_cast<uint32_t>(delta));
-    // Every case is computed and the right one selected: no branches for the
-    // random-looking order in which a picture's pixels take them.
     const int k = static_cast<int>(LUT_DELTA2[delta & 255]);
-    const fixed from_r = k * (g - b), from_g = itofix(120) + k * (b - r), from_b = itofix(240) + k * (r - g);
-    fixed hf = r == v ? from_r : (g == v ? from_g : from_b);
-    hf += hf < 0 ? itofix(360) : 0;
-    int h = static_cast<int>(static_cast<uint32_t>(fixtoi(hf)) + static_cast<uint32_t>(shift));
-    h += h < 0 ? 360 : (h > 359 ? -360 : 0);
-    const int t = wrap_mul(h, 1092);
-    const int sector = h == 360 ? 0 : t >> 16;
-    const int f = h == 360 ? 0 : t - (sector << 16);
-    const int lo = fixtoi(wrap_mul(v, 65536 - s));
-    const int q = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * (f >> 4)) >> 8)));
-    const int u = fixtoi(wrap_mul(v, 65536 - (((s >> 4) * ((65536 - f) >> 4)) >> 8)));
-    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q.
-    const int ro = sector == 0 || sector == 5 ? v : (sector == 1 ? q : (sector == 4 ? u : lo));
-    const int go = sector == 1 || sector == 2 ? v : (sector == 0 ? u : (sector == 3 ? q : lo));
-    const int bo = sector == 3 || sector == 4 ? v : (sector == 2 ? u : (sector == 5 ? q : lo));
-    const bool keep = v == 0 || s == 0 || sector < 0 || sector > 5;  // grey stays grey
-    return keep ? p : px_argb(p, ro, go, bo);
+    // The hue from the channel that holds v (red first, then green), picked
+    // by masks rather than branches: which one holds it looks random along a
+    // row. |k * difference| <= 60 degrees, so the hue is 0..360.
+    const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v), by_b = ~(by_r | by_g);
+    const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
+    fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
+    hf += (hf >> 31) & itofix(360);
+    const HueTurn& e = turn[fixtoi(hf)];
+    const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - s)));
+    const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((s >> 4) * e.f4) >> 8))));
+    const uint32_t turned =
+        (p & 0xFF000000u) | static_cast<uint32_t>(v) << e.sv | mid << e.sm | lo << e.sl;
+    const uint32_t keep = e.keep | (0u - static_cast<uint32_t>(delta == 0));
+    return (p & keep) | (turned & ~keep);
   }
 };
 
@@ -118,7 +157,8 @@ int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, in
   if (px_scalar_only()) {
     px_region_map(in, mask, out, width, height, rect, HueShift{shift});
   } else {
-    px_region_map(in, mask, out, width, height, rect, HueShiftInline{shift});
+    const HueTurnTable table = hue_turn_table(shift);
+    px_region_map(in, mask, out, width, height, rect, HueShiftTable{table.data()});
   }
   return PX_OK;
 }
