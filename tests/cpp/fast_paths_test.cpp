@@ -425,6 +425,78 @@ TEST(RegionOpsFast, FadedMapsAndGreyscaleReciprocalAgreeWithTheDivisions) {
   }
 }
 
+// The 16-bit conversions of the fast paths against the plain ones: every
+// colour forwards; backwards every chroma pair up to the bound, over the
+// lumas the tone steps produce and the ends of the brightness bound.
+TEST(YccFast, SixteenBitConversionsAgreeWithThePlainOnes) {
+  using namespace px_tone;
+  for (int c = 0; c < (1 << 24); ++c) {
+    const Rgb x{c >> 16, (c >> 8) & 255, c & 255};
+    const Ycc a = to_ycc(x), b = to_ycc16(x);
+    ASSERT_TRUE(a.y == b.y && a.cb == b.cb && a.cr == b.cr) << std::hex << c;
+  }
+  std::vector<int> lumas;
+  for (int y = -140; y <= 400; ++y) lumas.push_back(y);
+  for (int end : {-Brightness16::kMaxOffset, Brightness16::kMaxOffset + 255}) {
+    for (int d = -3; d <= 3; ++d) lumas.push_back(end + d);
+  }
+  const uint32_t alpha = 0x5A000000u;
+  for (int y : lumas) {
+    for (int cb = -kYcc16Chroma; cb <= kYcc16Chroma; ++cb) {
+      for (int cr = -kYcc16Chroma; cr <= kYcc16Chroma; ++cr) {
+        ASSERT_EQ(from_ycc(alpha, {y, cb, cr}), from_ycc16(alpha, {y, cb, cr})) << y << " " << cb << " " << cr;
+      }
+    }
+  }
+}
+
+// Brightness and temperature levels far outside their scales take the plain
+// pixel function on the fast path too (the 16-bit one would overflow).
+TEST(YccFast, LevelsBeyondTheSixteenBitBoundsMatchThePlainPath) {
+  const Pic in = random_picture(67, 5, 97);
+  const px_rect whole{0, -1, 0, -1}, part{2, 40, 1, 3};
+  const auto mask = random_mask(in.size(), 98);
+  auto m = mask;
+  for (int level : {-1000000, -1629, -1628, 1648, 1649, 3300, 1000000}) {
+    for (px_rect r : {whole, part}) {
+      expect_same_both_ways(
+          Pic(in.size()), [&](Pic& o) { px_control_brightness(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, r); },
+          label("brightness ", level));
+    }
+    expect_same_both_ways(
+        Pic(in.size()), [&](Pic& o) { px_control_brightness_all(const_cast<int*>(in.data()), o.data(), 67, 5, level); },
+        label("brightness all ", level));
+  }
+  for (int level : {-500, -3, -2, 22, 23, 40, 500}) {
+    expect_same_both_ways(
+        Pic(in.size()), [&](Pic& o) { px_control_temperature(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole); },
+        label("temperature ", level));
+    expect_same_both_ways(
+        Pic(in.size()), [&](Pic& o) { px_control_temperature_all(const_cast<int*>(in.data()), o.data(), 67, 5, level); },
+        label("temperature all ", level));
+  }
+  for (int level : {-200, -12, 112, 300}) {
+    expect_same_both_ways(
+        Pic(in.size()),
+        [&](Pic& o) { px_control_temperature_range100(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole); },
+        label("temperature100 ", level));
+  }
+}
+
+// Point colour on a lattice through the whole colour cube (every chroma
+// quarter and its edges).
+TEST(PointColourFast, ColourCubeKeptOrGreyedAsThePlainPath) {
+  Pic cube;
+  for (int r = 0; r < 256; r += 3)
+    for (int g = 0; g < 256; g += 3)
+      for (int b = 0; b < 256; b += 5) cube.push_back(static_cast<int>(0x3C000000u | r << 16 | g << 8 | b));
+  using Whole = void (*)(int*, int*, int, int);
+  for (Whole fn : {px_point_color_red, px_point_color_yellow, px_point_color_green, px_point_color_blue}) {
+    const int n = static_cast<int>(cube.size());
+    expect_same_both_ways(Pic(cube.size()), [&](Pic& o) { fn(cube.data(), o.data(), n, 1); }, "point colour cube");
+  }
+}
+
 TEST(PointColourFast, EveryColourKeptOrGreyedAsThePlainPath) {
   using Whole = void (*)(int*, int*, int, int);
   const std::pair<const char*, Whole> ops[] = {{"red", px_point_color_red},

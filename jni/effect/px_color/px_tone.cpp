@@ -19,7 +19,11 @@ using namespace px_tone;
 // brightness (a plain per-channel offset); the masked form uses the luma rule.
 void brightness_region(int* in, unsigned char* mask, int* out, int width, int height, int offset, px_rect rect) {
   if (!px_rect_empty(rect)) {
-    px_region_map(in, mask, out, width, height, rect, Brightness{offset});
+    if (px_scalar_only() || !Brightness16::fits(offset)) {
+      px_region_map(in, mask, out, width, height, rect, Brightness{offset});
+    } else {
+      px_region_map(in, mask, out, width, height, rect, Brightness16{offset});
+    }
     return;
   }
   structIELImage src{width, height, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(in)};
@@ -27,6 +31,15 @@ void brightness_region(int* in, unsigned char* mask, int* out, int width, int he
   int32_t level = offset;
   structIELEffectParams params{IEL_EFFECT_VARIABLE_BRIGHTNESS, &level, nullptr, 0, 0};
   IEL_Apply_Effect(&src, &dst, &params);
+}
+
+template <class Map>
+void temperature_map(Map map, Temperature t) {
+  if (!px_scalar_only() && Temperature16::fits(t)) {
+    map(Temperature16{t.cb_shift, t.cr_shift});
+  } else {
+    map(t);
+  }
 }
 
 }  // namespace
@@ -53,11 +66,13 @@ void px_control_saturation_range100(int* in, unsigned char* mask, int* out, int 
   px_region_map(in, mask, out, width, height, rect, Saturation(saturation_of_range100(level)));
 }
 void px_control_temperature(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Temperature(temperature_of(level)));
+  temperature_map([&](auto fn) { px_region_map(in, mask, out, width, height, rect, fn); },
+                  Temperature(temperature_of(level)));
 }
 void px_control_temperature_range100(int* in, unsigned char* mask, int* out, int width, int height, int level,
                                      px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Temperature(temperature_of_range100(level)));
+  temperature_map([&](auto fn) { px_region_map(in, mask, out, width, height, rect, fn); },
+                  Temperature(temperature_of_range100(level)));
 }
 
 int px_control_exposure(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
@@ -88,7 +103,12 @@ void px_control_greyscale(int* in, unsigned char* mask, int* out, int width, int
 }
 
 void px_control_brightness_all(int* in, int* out, int width, int height, int level) {
-  px_map_pixels(in, out, width, height, Brightness{(level - 10) * 10});
+  const int offset = static_cast<int>(static_cast<uint32_t>(level - 10) * 10u);
+  if (px_scalar_only() || !Brightness16::fits(offset)) {
+    px_map_pixels(in, out, width, height, Brightness{offset});
+  } else {
+    px_map_pixels(in, out, width, height, Brightness16{offset});
+  }
 }
 void px_control_contrast_all(int* in, int* out, int width, int height, int level) {
   px_map_pixels(in, out, width, height, contrast_curve(level - 10));
@@ -97,7 +117,7 @@ void px_control_saturation_all(int* in, int* out, int width, int height, int lev
   px_map_pixels(in, out, width, height, Saturation(saturation_of(level)));
 }
 void px_control_temperature_all(int* in, int* out, int width, int height, int level) {
-  px_map_pixels(in, out, width, height, Temperature(temperature_of(level)));
+  temperature_map([&](auto fn) { px_map_pixels(in, out, width, height, fn); }, Temperature(temperature_of(level)));
 }
 int px_control_fadedcolor_all(int* in, int* out, int width, int height, int level) {
   if (!in || !out || level > 100) return PX_ERR_NULL;

@@ -31,6 +31,30 @@ inline uint32_t from_ycc(uint32_t alpha_source, Ycc v) {
                  px_clamp255(v.y - ((88 * v.cb + 183 * v.cr) >> 8)), px_clamp255(v.y + ((v.cb * 454) >> 8)));
 }
 
+// The same conversions in 16-bit arithmetic for the fast paths, so loops
+// vectorise eight pixels to a register: luma fits 16 bits unsigned and the
+// chroma sums 16 bits signed (|sum| <= 128 * 255); the inverse's large
+// weights are split as c * 359 = c * 256 + c * 103, c * 454 = c * 256 + c * 198
+// and 88 cb + 183 cr = 256 cr + (88 cb - 73 cr), which leaves the floors of
+// the shifted sums unchanged (c * 256 is a whole multiple of 256). The split
+// products fit 16 bits while |cb| and |cr| are at most kYcc16Chroma.
+constexpr int kYcc16Chroma = 165;
+inline Ycc to_ycc16(Rgb c) {
+  return {static_cast<uint16_t>(77 * c.r + 150 * c.g + 29 * c.b) >> 8,
+          static_cast<int16_t>(-43 * c.r - 85 * c.g + 128 * c.b) >> 8,
+          static_cast<int16_t>(128 * c.r - 107 * c.g - 21 * c.b) >> 8};
+}
+// Channel sums and the clamp in 16 bits as well (|y| stays far below 2^14).
+inline uint32_t clamp255_16(int v) {
+  const int16_t c = static_cast<int16_t>(v);
+  return static_cast<uint8_t>(c < 0 ? 0 : (c > 255 ? 255 : c));
+}
+inline uint32_t from_ycc16(uint32_t alpha_source, Ycc v) {
+  return (alpha_source & 0xFF000000u) | clamp255_16(v.y + v.cr + (static_cast<int16_t>(v.cr * 103) >> 8)) << 16 |
+         clamp255_16(v.y - v.cr - (static_cast<int16_t>(88 * v.cb - 73 * v.cr) >> 8)) << 8 |
+         clamp255_16(v.y + v.cb + (static_cast<int16_t>(v.cb * 198) >> 8));
+}
+
 // ---- pixel functions -------------------------------------------------------
 
 struct Brightness {
@@ -50,6 +74,34 @@ struct Temperature {
     v.cb += cb_shift;
     v.cr += cr_shift;
     return from_ycc(p, v);
+  }
+};
+
+// Brightness and Temperature through the 16-bit conversions (the fast paths).
+struct Brightness16 {
+  int offset;
+  // Exact while the luma with the offset stays well inside 16 bits.
+  static constexpr int kMaxOffset = 16384;
+  static bool fits(int offset) { return offset >= -kMaxOffset && offset <= kMaxOffset; }
+  uint32_t operator()(uint32_t p) const {
+    Ycc v = to_ycc16(unpack(p));
+    v.y += offset;
+    return from_ycc16(p, v);
+  }
+};
+struct Temperature16 {
+  int cb_shift, cr_shift;
+  // Exact while the shifted chroma stays within kYcc16Chroma (chroma before
+  // the shift is -128..127); every level of both scales keeps it there.
+  static bool fits(const Temperature& t) {
+    const int limit = kYcc16Chroma - 128;
+    return t.cb_shift >= -limit && t.cb_shift <= limit && t.cr_shift >= -limit && t.cr_shift <= limit;
+  }
+  uint32_t operator()(uint32_t p) const {
+    Ycc v = to_ycc16(unpack(p));
+    v.cb += cb_shift;
+    v.cr += cr_shift;
+    return from_ycc16(p, v);
   }
 };
 

@@ -52,7 +52,7 @@ bool dawncast_fused(const int* in, int* out, const int* overlay, const int* scre
     px_adjust_RGB_all(o, o, w, h, 11, 10, 10);
   });
   const Saturation s9(saturation_of(9));
-  const Brightness b9{-10};
+  const Brightness16 b9{-10};
   const auto* src = reinterpret_cast<const uint32_t*>(in);
   const auto* ov = reinterpret_cast<const uint32_t*>(overlay);
   const auto* sc = reinterpret_cast<const uint32_t*>(screen);

@@ -27,7 +27,7 @@ void retro_fused(int* in, int* out, int width, int height) {
   const FadedArith faded{50, 50};
   const ContrastArith c9{-1}, c12{2};
   px_map_pixels(in, out, width, height, [&](uint32_t p) {
-    return c12(Brightness{10}(c9(s7(faded(Brightness{20}(s5(p)))))));
+    return c12(Brightness16{10}(c9(s7(faded(Brightness16{20}(s5(p)))))));
   });
 }
 }  // namespace
@@ -239,7 +239,7 @@ void px_apply_vintage(int* in, int* out, int width, int height) {
   if (!px_scalar_only() && in && out && width > 0 && height > 0) {
     const VintageMaps m = vintage_maps();
     const Saturation s3(saturation_of(3));
-    vignette_between(in, out, width, height, [&](uint32_t p) { return m.after(Brightness{20}(m.before(p))); },
+    vignette_between(in, out, width, height, [&](uint32_t p) { return m.after(Brightness16{20}(m.before(p))); },
                      [&](uint32_t p) { return s3(p); });
     return;
   }
@@ -256,7 +256,7 @@ void px_apply_vintage_prev(int* in, int* out, int width, int height) {
   if (!px_scalar_only() && in && out) {
     const VintageMaps m = vintage_maps();
     const Saturation s3(saturation_of(3));
-    px_map_pixels(in, out, width, height, [&](uint32_t p) { return s3(m.after(Brightness{20}(m.before(p)))); });
+    px_map_pixels(in, out, width, height, [&](uint32_t p) { return s3(m.after(Brightness16{20}(m.before(p)))); });
     return;
   }
   vintage_tones(in, out, width, height);
