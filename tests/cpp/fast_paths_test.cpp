@@ -236,7 +236,8 @@ TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
   for (const auto& pair_ : chains) {
     const auto name = pair_.first;
     const auto fn = pair_.second;
-    for (const auto& pair_ : kSizes) {
+    // Rows longer than the fused loops' runs of 256 pixels as well.
+    for (const auto& pair_ : {kSizes[1], kSizes[2], kSizes[4], kSizes[6], std::pair{601, 5}, std::pair{513, 2}}) {
       const auto w = pair_.first;
       const auto h = pair_.second;
       Pic in = random_picture(w, h, 61 + w * 7 + h);
@@ -249,8 +250,18 @@ TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
   }
 }
 
+// The fused dawn cast's overlay sums two 16-bit products by halving them
+// first: the same shifted sum for every pair of products that can occur.
+TEST(FilterChainsFast, HalvedSumOfTwoProductsShiftsAsTheSum) {
+  for (uint32_t a = 0; a <= 255u * 255u; ++a) {
+    for (uint32_t b = 0; b <= 255u * 255u; b += (b < 300 || b > 64700) ? 1 : 97) {
+      ASSERT_EQ((a + b) >> 8, ((a >> 1) + (b >> 1) + (a & b & 1)) >> 7) << a << " " << b;
+    }
+  }
+}
+
 TEST(FilterChainsFast, DawnCastMatchesTheStepByStepChainWithAnyArraysShared) {
-  for (const auto& pair_ : kSizes) {
+  for (const auto& pair_ : {kSizes[0], kSizes[1], kSizes[2], kSizes[3], kSizes[5], kSizes[6], std::pair{601, 3}}) {
     const auto w = pair_.first;
     const auto h = pair_.second;
     const Pic in = random_picture(w, h, 71 + w), overlay = random_picture(w, h, 72 + h),
