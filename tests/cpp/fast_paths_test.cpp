@@ -529,27 +529,3 @@ TEST(PointColourFast, EveryColourKeptOrGreyedAsThePlainPath) {
 }
 
 }  // namespace
-
-namespace {
-
-// The table-free contrast and faded colour of the fused retro against their
-// tables, for every channel value and every level they can be given.
-TEST(FilterChainsFast, TableFreeStepsAgreeWithTheirTables) {
-  for (int step = 0; step <= 137; ++step) ASSERT_EQ(step / 10, (step * 205) >> 11) << step;
-  for (int k = -60; k <= 60; ++k) {
-    const px_tone::Curve table = px_tone::contrast_curve(k);
-    const px_tone::ContrastArith arith{k};
-    for (int c = 0; c < 256; ++c) ASSERT_EQ(arith.channel(c), table.map[c]) << "contrast " << k << " at " << c;
-  }
-  for (int level = 0; level <= 100; ++level) {
-    const px_tone::ChannelMaps maps = px_tone::faded_maps(level);
-    const px_tone::FadedArith arith{level, 100 - level};
-    for (int c = 0; c < 256; ++c) {
-      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 141, 26520), maps.r[c]) << level << " " << c;
-      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 188, 13260), maps.g[c]) << level << " " << c;
-      ASSERT_EQ(px_tone::FadedArith::channel(c, arith.g, arith.f, 107, 18360), maps.b[c]) << level << " " << c;
-    }
-  }
-}
-
-}  // namespace

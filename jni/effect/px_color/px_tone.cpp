@@ -34,6 +34,15 @@ void brightness_region(int* in, unsigned char* mask, int* out, int width, int he
 }
 
 template <class Map>
+void saturation_map(Map map, Saturation s) {
+  if (px_scalar_only()) {
+    map(s);
+  } else {
+    map(Saturation16(s));
+  }
+}
+
+template <class Map>
 void temperature_map(Map map, Temperature t) {
   if (!px_scalar_only() && Temperature16::fits(t)) {
     map(Temperature16{t.cb_shift, t.cr_shift});
@@ -59,11 +68,13 @@ void px_control_contrast_range100(int* in, unsigned char* mask, int* out, int wi
   px_region_map(in, mask, out, width, height, rect, contrast_curve_range100(level));
 }
 void px_control_saturation(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Saturation(saturation_of(level)));
+  saturation_map([&](auto fn) { px_region_map(in, mask, out, width, height, rect, fn); },
+                 Saturation(saturation_of(level)));
 }
 void px_control_saturation_range100(int* in, unsigned char* mask, int* out, int width, int height, int level,
                                     px_rect rect) {
-  px_region_map(in, mask, out, width, height, rect, Saturation(saturation_of_range100(level)));
+  saturation_map([&](auto fn) { px_region_map(in, mask, out, width, height, rect, fn); },
+                 Saturation(saturation_of_range100(level)));
 }
 void px_control_temperature(int* in, unsigned char* mask, int* out, int width, int height, int level, px_rect rect) {
   temperature_map([&](auto fn) { px_region_map(in, mask, out, width, height, rect, fn); },
@@ -114,7 +125,11 @@ void px_control_contrast_all(int* in, int* out, int width, int height, int level
   px_map_pixels(in, out, width, height, contrast_curve(level - 10));
 }
 void px_control_saturation_all(int* in, int* out, int width, int height, int level) {
-  px_map_pixels(in, out, width, height, Saturation(saturation_of(level)));
+  if (px_scalar_only()) {
+    px_map_pixels(in, out, width, height, Saturation(saturation_of(level)));
+  } else {
+    px_map_pixels(in, out, width, height, Saturation16(Saturation(saturation_of(level))));
+  }
 }
 void px_control_temperature_all(int* in, int* out, int width, int height, int level) {
   temperature_map([&](auto fn) { px_map_pixels(in, out, width, height, fn); }, Temperature(temperature_of(level)));

@@ -124,6 +124,22 @@ struct Saturation {
   }
 };
 
+// Saturation with its weights and the channels as 16-bit values (every
+// weight is below 2^12 and each product below 2^20), so the products are
+// 16 x 16 -> 32-bit multiplies, which vector units have (the fast paths).
+struct Saturation16 {
+  int16_t ra, gc, bb, a, c, b;
+  explicit Saturation16(const Saturation& s)
+      : ra(static_cast<int16_t>(s.ra)), gc(static_cast<int16_t>(s.gc)), bb(static_cast<int16_t>(s.bb)),
+        a(static_cast<int16_t>(s.a)), c(static_cast<int16_t>(s.c)), b(static_cast<int16_t>(s.b)) {}
+  uint32_t operator()(uint32_t p) const {
+    const int16_t r = static_cast<int16_t>((p >> 16) & 255), g = static_cast<int16_t>((p >> 8) & 255),
+                  bl = static_cast<int16_t>(p & 255);
+    return px_argb(p, px_clamp255((r * ra + g * c + bl * b) >> 10), px_clamp255((r * a + g * gc + bl * b) >> 10),
+                   px_clamp255((r * a + g * c + bl * bb) >> 10));
+  }
+};
+
 // A 256-entry curve applied to R, G and B.
 struct Curve {
   std::array<uint8_t, 256> map;
@@ -268,47 +284,6 @@ struct GreyscaleFast {
     const int m = (s * 43691) >> 17;
     const int v = px_clamp255((m * gain) >> 16);  // 32-bit product, wrapping as on the target
     return px_argb(p, v, v, v);
-  }
-};
-
-// ---- table-free forms, for loops the compiler vectorises --------------------
-// Each gives exactly what its table does (checked for every channel value
-// and level in the tests).
-
-// contrast_curve(k) computed: the step (|c - 128| + 9) / 10 by the
-// reciprocal (x * 205) >> 11, exact for x <= 137.
-struct ContrastArith {
-  int k;
-  int channel(int c) const {
-    const int d = c - 128;
-    const int a = d < 0 ? -d : d;
-    const int step = ((a + 9) * 205) >> 11;
-    const int v = c + (d < 0 ? -step : step) * k;
-    const int lo = c < 128 ? 0 : 128, hi = c < 128 ? 128 : 255;
-    return v < lo ? lo : (v > hi ? hi : v);
-  }
-  uint32_t operator()(uint32_t p) const {
-    return px_argb(p, channel(static_cast<int>((p >> 16) & 255)), channel(static_cast<int>((p >> 8) & 255)),
-                   channel(static_cast<int>(p & 255)));
-  }
-};
-
-// Faded colour for levels 0..100 without an integer division: the numerator
-// n (0 <= n < 2^24) is divided through a float reciprocal, and the quotient,
-// off by at most one, is corrected by multiplying back.
-struct FadedArith {
-  int f, g;
-  static int channel(int c, int g, int f, int mul, int add) {
-    const int n = 255 * c * g + (mul * c + add) * f;
-    int q = static_cast<int>(static_cast<float>(n) * (1.0f / 25500.0f));
-    q -= q * 25500 > n ? 1 : 0;
-    q += (q + 1) * 25500 <= n ? 1 : 0;
-    return q > 255 ? 255 : q;
-  }
-  uint32_t operator()(uint32_t p) const {
-    const Rgb x = unpack(p);
-    return px_argb(p, channel(x.r, g, f, 141, 26520), channel(x.g, g, f, 188, 13260),
-                   channel(x.b, g, f, 107, 18360));
   }
 };
 

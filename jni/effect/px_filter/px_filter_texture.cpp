@@ -78,7 +78,7 @@ bool dawncast_fused(const int* in, int* out, const int* overlay, const int* scre
     px_control_exposure_all(o, o, w, h, 8);
     px_adjust_RGB_all(o, o, w, h, 11, 10, 10);
   });
-  const Saturation s9(saturation_of(9));
+  const Saturation16 s9(Saturation(saturation_of(9)));
   const Brightness16 b9{-10};
   const auto* src = reinterpret_cast<const uint32_t*>(in);
   const auto* ov = reinterpret_cast<const uint32_t*>(overlay);
@@ -92,7 +92,7 @@ bool dawncast_fused(const int* in, int* out, const int* overlay, const int* scre
     constexpr size_t kRun = 256;
     uint32_t run[kRun];
     const Brightness16 bright = b9;
-    const Saturation sat = s9;
+    const Saturation16 sat = s9;
     for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; i += kRun) {
       const size_t n = end - i < kRun ? end - i : kRun;
       const uint32_t *s = src + i, *scr = sc + i, *ovl = ov + i;
