@@ -135,6 +135,83 @@ struct HueShiftTable {
   }
 };
 
+// The whole-picture turn in short runs of pixels, in three loops: the hue
+// index, s and v by arithmetic (floor(65536 / n) for n = 1..255 by a float
+// division: the quotient is never within half a float step of the next
+// integer, so its floor is exact), which vectorises; the table's entries
+// copied out for each pixel's hue; then lo, the third channel and their
+// placement (byte masks: a channel value times 0x010101 masked to its place),
+// which vectorises again.
+struct HueRunEntry {
+  uint32_t keep;           // all ones: the turned hue is in no sector
+  uint32_t mv, mm, ml;     // byte masks of v, the third channel and lo
+  int32_t f4;
+};
+
+inline int floor_65536_over(int n) {  // n = 1..255
+  return static_cast<int>(65536.0f / static_cast<float>(n));
+}
+
+void hue_in_runs(const uint32_t* src, uint32_t* dst, int width, int height, const HueTurnTable& table) {
+  std::array<HueRunEntry, 361> turn{};
+  for (size_t h = 0; h < turn.size(); ++h) {
+    const HueTurn& e = table[h];
+    turn[h] = {e.keep, 0xFFu << e.sv, 0xFFu << e.sm, 0xFFu << e.sl, e.f4};
+  }
+  const size_t w = static_cast<size_t>(width);
+  px_for_rows(height, [&](int y0, int y1) {
+    constexpr size_t kRun = 256;
+    int32_t hue[kRun], sat[kRun], val[kRun], f4[kRun];
+    uint32_t keep[kRun], mv[kRun], mm[kRun], ml[kRun];
+    const HueRunEntry* t = turn.data();
+    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; i += kRun) {
+      const size_t n = end - i < kRun ? end - i : kRun;
+      const uint32_t* s = src + i;
+      uint32_t* d = dst + i;
+      for (size_t j = 0; j < n; ++j) {
+        const uint32_t p = s[j];
+        const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
+                  b = static_cast<int>(p & 255);
+        int v = r > g ? r : g;
+        v = b > v ? b : v;
+        int min = r < g ? r : g;
+        min = b < min ? b : min;
+        const int delta = v - min;
+        // v = 0 or delta = 0: multiplied by delta = 0 or kept below, as the
+        // tables' entry 0 (0) gives.
+        const int sv = floor_65536_over(v > 0 ? v : 1) * delta;
+        const int k = 60 * floor_65536_over(delta > 0 ? delta : 1);
+        const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v),
+                  by_b = ~(by_r | by_g);
+        const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
+        fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
+        hf += (hf >> 31) & itofix(360);
+        hue[j] = fixtoi(hf);
+        sat[j] = sv;
+        val[j] = v;
+      }
+      for (size_t j = 0; j < n; ++j) {
+        const HueRunEntry& e = t[hue[j]];
+        keep[j] = e.keep;
+        mv[j] = e.mv;
+        mm[j] = e.mm;
+        ml[j] = e.ml;
+        f4[j] = e.f4;
+      }
+      for (size_t j = 0; j < n; ++j) {
+        const uint32_t p = s[j];
+        const int v = val[j], sv = sat[j];
+        const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - sv)));
+        const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((sv >> 4) * f4[j]) >> 8))));
+        const uint32_t turned = (p & 0xFF000000u) | (static_cast<uint32_t>(v) * 0x010101u & mv[j]) |
+                                (mid * 0x010101u & mm[j]) | (lo * 0x010101u & ml[j]);
+        const uint32_t kept = keep[j] | (0u - static_cast<uint32_t>(sv == 0));
+        d[j] = (p & kept) | (turned & ~kept);
+      }
+    }
+  });
+}
+
 // True when no hue 0..360 turned by `shift` lands in a sector (a turn of
 // more than two full circles): every pixel then keeps its colour.
 bool turns_nothing(int shift) {
@@ -159,7 +236,13 @@ int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, in
     px_region_map(in, mask, out, width, height, rect, HueShift{shift});
   } else {
     const HueTurnTable table = hue_turn_table(shift);
-    px_region_map(in, mask, out, width, height, rect, HueShiftTable{table.data()});
+    if (px_rect_empty(rect)) {
+      if (width > 0 && height > 0) {
+        hue_in_runs(reinterpret_cast<const uint32_t*>(in), reinterpret_cast<uint32_t*>(out), width, height, table);
+      }
+    } else {
+      px_region_map(in, mask, out, width, height, rect, HueShiftTable{table.data()});
+    }
   }
   return PX_OK;
 }
