@@ -471,7 +471,8 @@ TEST(YccFast, LevelsBeyondTheSixteenBitBoundsMatchThePlainPath) {
   for (int level : {-1000000, -1629, -1628, 1648, 1649, 3300, 1000000}) {
     for (px_rect r : {whole, part}) {
       expect_same_both_ways(
-          Pic(in.size()), [&](Pic& o) { px_control_brightness(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, r); },
+          Pic(in.size()),
+          [&](Pic& o) { px_control_brightness(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, r); },
           label("brightness ", level));
     }
     expect_same_both_ways(
@@ -480,16 +481,20 @@ TEST(YccFast, LevelsBeyondTheSixteenBitBoundsMatchThePlainPath) {
   }
   for (int level : {-500, -3, -2, 22, 23, 40, 500}) {
     expect_same_both_ways(
-        Pic(in.size()), [&](Pic& o) { px_control_temperature(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole); },
+        Pic(in.size()),
+        [&](Pic& o) { px_control_temperature(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole); },
         label("temperature ", level));
     expect_same_both_ways(
-        Pic(in.size()), [&](Pic& o) { px_control_temperature_all(const_cast<int*>(in.data()), o.data(), 67, 5, level); },
+        Pic(in.size()),
+        [&](Pic& o) { px_control_temperature_all(const_cast<int*>(in.data()), o.data(), 67, 5, level); },
         label("temperature all ", level));
   }
   for (int level : {-200, -12, 112, 300}) {
     expect_same_both_ways(
         Pic(in.size()),
-        [&](Pic& o) { px_control_temperature_range100(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole); },
+        [&](Pic& o) {
+          px_control_temperature_range100(const_cast<int*>(in.data()), m.data(), o.data(), 67, 5, level, whole);
+        },
         label("temperature100 ", level));
   }
 }
@@ -504,7 +509,8 @@ TEST(PointColourFast, ColourCubeKeptOrGreyedAsThePlainPath) {
   using Whole = void (*)(int*, int*, int, int);
   for (Whole fn : {px_point_color_red, px_point_color_yellow, px_point_color_green, px_point_color_blue}) {
     const int n = static_cast<int>(cube.size());
-    expect_same_both_ways(Pic(cube.size()), [&](Pic& o) { fn(cube.data(), o.data(), n, 1); }, "point colour cube");
+    expect_same_both_ways(
+        Pic(cube.size()), [&](Pic& o) { fn(cube.data(), o.data(), n, 1); }, "point colour cube");
   }
 }
 

@@ -64,9 +64,9 @@ struct HueShift {
 // v, lo and that channel and the f term it uses, all worked out by the plain
 // conversion's own steps; per pixel remain the hue, s and two products.
 struct HueTurn {
-  uint32_t keep;              // all ones: the turned hue is in no sector
-  uint32_t sv, sm, sl;        // shifts placing v, the third channel and lo
-  int32_t f4;                 // f >> 4 (q) or (65536 - f) >> 4 (u)
+  uint32_t keep;        // all ones: the turned hue is in no sector
+  uint32_t sv, sm, sl;  // shifts placing v, the third channel and lo
+  int32_t f4;           // f >> 4 (q) or (65536 - f) >> 4 (u)
 };
 using HueTurnTable = std::array<HueTurn, 361>;
 
@@ -91,15 +91,12 @@ HueTurnTable hue_turn_table(int shift) {
     }
     const int f = h2 == 360 ? 0 : wrap_mul(h2, 1092) - (sector << 16);
     const int32_t q = f >> 4, u = (65536 - f) >> 4;
-    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q.
-    switch (sector) {
-      case 0: e = {0, 16, 8, 0, u}; break;
-      case 1: e = {0, 8, 16, 0, q}; break;
-      case 2: e = {0, 8, 0, 16, u}; break;
-      case 3: e = {0, 0, 8, 16, q}; break;
-      case 4: e = {0, 0, 16, 8, u}; break;
-      default: e = {0, 16, 0, 8, q}; break;
-    }
+    // Sectors 0..5: R = v q lo lo u v, G = u v v q lo lo, B = lo lo u v v q:
+    // the shifts of v, the third channel and lo in each; the third channel
+    // is q in the odd sectors and u in the even ones.
+    static constexpr uint32_t kPlace[6][3] = {{16, 8, 0}, {8, 16, 0}, {8, 0, 16}, {0, 8, 16}, {0, 16, 8}, {16, 0, 8}};
+    const uint32_t* place = kPlace[sector];
+    e = {0, place[0], place[1], place[2], sector % 2 == 1 ? q : u};
   }
   return t;
 }
@@ -128,8 +125,7 @@ struct HueShiftTable {
     const HueTurn& e = turn[fixtoi(hf)];
     const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - s)));
     const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((s >> 4) * e.f4) >> 8))));
-    const uint32_t turned =
-        (p & 0xFF000000u) | static_cast<uint32_t>(v) << e.sv | mid << e.sm | lo << e.sl;
+    const uint32_t turned = (p & 0xFF000000u) | static_cast<uint32_t>(v) << e.sv | mid << e.sm | lo << e.sl;
     const uint32_t keep = e.keep | (0u - static_cast<uint32_t>(delta == 0));
     return (p & keep) | (turned & ~keep);
   }
@@ -143,8 +139,8 @@ struct HueShiftTable {
 // placement (byte masks: a channel value times 0x010101 masked to its place),
 // which vectorises again.
 struct HueRunEntry {
-  uint32_t keep;           // all ones: the turned hue is in no sector
-  uint32_t mv, mm, ml;     // byte masks of v, the third channel and lo
+  uint32_t keep;        // all ones: the turned hue is in no sector
+  uint32_t mv, mm, ml;  // byte masks of v, the third channel and lo
   int32_t f4;
 };
 
@@ -181,8 +177,7 @@ void hue_in_runs(const uint32_t* src, uint32_t* dst, int width, int height, cons
         // tables' entry 0 (0) gives.
         const int sv = floor_65536_over(v > 0 ? v : 1) * delta;
         const int k = 60 * floor_65536_over(delta > 0 ? delta : 1);
-        const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v),
-                  by_b = ~(by_r | by_g);
+        const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v), by_b = ~(by_r | by_g);
         const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
         fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
         hf += (hf >> 31) & itofix(360);

@@ -130,8 +130,12 @@ struct Saturation {
 struct Saturation16 {
   int16_t ra, gc, bb, a, c, b;
   explicit Saturation16(const Saturation& s)
-      : ra(static_cast<int16_t>(s.ra)), gc(static_cast<int16_t>(s.gc)), bb(static_cast<int16_t>(s.bb)),
-        a(static_cast<int16_t>(s.a)), c(static_cast<int16_t>(s.c)), b(static_cast<int16_t>(s.b)) {}
+      : ra(static_cast<int16_t>(s.ra)),
+        gc(static_cast<int16_t>(s.gc)),
+        bb(static_cast<int16_t>(s.bb)),
+        a(static_cast<int16_t>(s.a)),
+        c(static_cast<int16_t>(s.c)),
+        b(static_cast<int16_t>(s.b)) {}
   uint32_t operator()(uint32_t p) const {
     const int16_t r = static_cast<int16_t>((p >> 16) & 255), g = static_cast<int16_t>((p >> 8) & 255),
                   bl = static_cast<int16_t>(p & 255);

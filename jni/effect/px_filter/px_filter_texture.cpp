@@ -55,8 +55,8 @@ inline uint32_t screen_pixel16(uint32_t p, uint32_t t) {
 inline uint32_t overlay_channel16(uint32_t p, uint32_t t, int s) {
   const uint32_t ia = p >> 24, ta = t >> 24;
   const uint32_t c = (p >> s) & 255, k = (t >> s) & 255;
-  const uint32_t v = c < 128 ? static_cast<uint16_t>(k * c) >> 7
-                             : 255u - (static_cast<uint16_t>((255u - k) * (255u - c)) >> 7);
+  const uint32_t v =
+      c < 128 ? static_cast<uint16_t>(k * c) >> 7 : 255u - (static_cast<uint16_t>((255u - k) * (255u - c)) >> 7);
   const uint16_t a = static_cast<uint16_t>(ta * v), b = static_cast<uint16_t>(c * (ta ^ ia));
   const uint32_t m = static_cast<uint16_t>((a >> 1) + (b >> 1) + (a & b & 1)) >> 7;
   return (m > 255u ? 255u : m) << s;

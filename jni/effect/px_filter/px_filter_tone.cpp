@@ -303,8 +303,9 @@ void px_apply_vintage(int* in, int* out, int width, int height) {
     const VintageMaps m = vintage_maps();
     const Saturation16 s3(Saturation(saturation_of(3)));
     if (vintage_in_runs(in, out, width, height, m, s3)) return;
-    vignette_between(in, out, width, height, [&](uint32_t p) { return m.after(Brightness16{20}(m.before(p))); },
-                     [&](uint32_t p) { return s3(p); });
+    vignette_between(
+        in, out, width, height, [&](uint32_t p) { return m.after(Brightness16{20}(m.before(p))); },
+        [&](uint32_t p) { return s3(p); });
     return;
   }
   vintage_tones(in, out, width, height);
