@@ -298,15 +298,17 @@ struct PointColour {
   }
 };
 
-// PointColour through the 16-bit conversions of the tone adjustments (the
-// chroma of a colour is within their bounds), so the loop vectorises eight
-// pixels to a register.
+// PointColour through the conversions of the tone adjustments' fast paths
+// (16-bit with gcc, which then vectorises eight pixels to a register; the
+// chroma of a colour is within their bounds).
 template <class Keep>
 struct PointColour16 {
   Keep keep;
   uint32_t operator()(uint32_t p) const {
-    const px_tone::Ycc v = px_tone::to_ycc16(px_tone::unpack(p));
-    return keep(v.cb, v.cr) ? px_tone::from_ycc16(p, v) : px_argb(p, v.y, v.y, v.y);
+    namespace t = px_tone;
+    const t::Rgb c = t::unpack(p);
+    const t::Ycc v = t::kYccIn16Bits ? t::to_ycc16(c) : t::to_ycc(c);
+    return keep(v.cb, v.cr) ? (t::kYccIn16Bits ? t::from_ycc16(p, v) : t::from_ycc(p, v)) : px_argb(p, v.y, v.y, v.y);
   }
 };
 

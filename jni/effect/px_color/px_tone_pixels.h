@@ -39,6 +39,14 @@ inline uint32_t from_ycc(uint32_t alpha_source, Ycc v) {
 // the shifted sums unchanged (c * 256 is a whole multiple of 256). The split
 // products fit 16 bits while |cb| and |cr| are at most kYcc16Chroma.
 constexpr int kYcc16Chroma = 165;
+// The fast paths' functions below take the 16-bit forms where they are the
+// faster: with gcc; clang vectorises the 32-bit forms better (measured on
+// 12 MP pictures). Both give the same values.
+#if defined(__clang__)
+inline constexpr bool kYccIn16Bits = false;
+#else
+inline constexpr bool kYccIn16Bits = true;
+#endif
 inline Ycc to_ycc16(Rgb c) {
   return {static_cast<uint16_t>(77 * c.r + 150 * c.g + 29 * c.b) >> 8,
           static_cast<int16_t>(-43 * c.r - 85 * c.g + 128 * c.b) >> 8,
@@ -84,9 +92,9 @@ struct Brightness16 {
   static constexpr int kMaxOffset = 16384;
   static bool fits(int offset) { return offset >= -kMaxOffset && offset <= kMaxOffset; }
   uint32_t operator()(uint32_t p) const {
-    Ycc v = to_ycc16(unpack(p));
+    Ycc v = kYccIn16Bits ? to_ycc16(unpack(p)) : to_ycc(unpack(p));
     v.y += offset;
-    return from_ycc16(p, v);
+    return kYccIn16Bits ? from_ycc16(p, v) : from_ycc(p, v);
   }
 };
 struct Temperature16 {
@@ -98,10 +106,10 @@ struct Temperature16 {
     return t.cb_shift >= -limit && t.cb_shift <= limit && t.cr_shift >= -limit && t.cr_shift <= limit;
   }
   uint32_t operator()(uint32_t p) const {
-    Ycc v = to_ycc16(unpack(p));
+    Ycc v = kYccIn16Bits ? to_ycc16(unpack(p)) : to_ycc(unpack(p));
     v.cb += cb_shift;
     v.cr += cr_shift;
-    return from_ycc16(p, v);
+    return kYccIn16Bits ? from_ycc16(p, v) : from_ycc(p, v);
   }
 };
 
