@@ -3,6 +3,7 @@
 #include <benchmark/benchmark.h>
 
 #include <cstring>
+#include <vector>
 
 #include "bench_picture.h"
 #include "effect/px_color/px_auto_adjust.h"
@@ -19,6 +20,12 @@ COLOUR_BENCH(Memcpy, std::memcpy(p.out.data(), p.in.data(), p.in.size() * 4))
 // Level 7: a turn of 126 degrees (levels past 20 turn more than two circles and copy).
 COLOUR_BENCH(Hue, px_control_hue(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 7, kWhole))
 COLOUR_BENCH(Hue100, px_control_hue_range100(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 70, kWhole))
+// Masked: every pixel selected inside a full-picture rectangle.
+COLOUR_BENCH(Hue100Masked, {
+  static std::vector<unsigned char> all(p.in.size(), 1);
+  px_control_hue_range100(p.in.data(), all.data(), p.out.data(), p.width, p.height, 70,
+                          px_rect{0, p.width - 1, 0, p.height - 1});
+})
 COLOUR_BENCH(AdjustRGB,
              px_adjust_RGB(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 14, 10, 7, kWhole))
 COLOUR_BENCH(AdjustRGBAll, px_adjust_RGB_all(p.in.data(), p.out.data(), p.width, p.height, 14, 10, 7))

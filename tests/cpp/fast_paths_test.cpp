@@ -401,6 +401,12 @@ TEST(RegionOpsFast, HueTurnsEveryColourAsThePlainPath) {
         both_paths(Pic(cube.size()), [&](Pic& o) { hue100(cube.data(), nullptr, o.data(), w, h, level, whole); });
     EXPECT_EQ(first_difference(fast, plain), "none") << "hue100 " << level;
   }
+  // Masked, rows of the rectangle longer than the fast path's runs.
+  auto mask = random_mask(cube.size(), 7);
+  auto [fast, plain] = both_paths(Pic(cube.size(), 0x0BADF00D), [&](Pic& o) {
+    hue100(cube.data(), mask.data(), o.data(), w, h, 31, px_rect{3, 4000, 1, 4094});
+  });
+  EXPECT_EQ(first_difference(fast, plain), "none") << "hue100 masked";
   for (int level : {-3, 7}) {
     auto [fast, plain] =
         both_paths(Pic(cube.size()), [&](Pic& o) { hue(cube.data(), nullptr, o.data(), w, h, level, whole); });

@@ -101,37 +101,7 @@ HueTurnTable hue_turn_table(int shift) {
   return t;
 }
 
-struct HueShiftTable {
-  const HueTurn* turn;
-  // Inlined into the pixel loop (the compilers otherwise call it per pixel).
-  [[gnu::always_inline]] uint32_t operator()(uint32_t p) const {
-    const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
-              b = static_cast<int>(p & 255);
-    int v = r > g ? r : g;
-    v = b > v ? b : v;
-    int min = r < g ? r : g;
-    min = b < min ? b : min;
-    const int delta = v - min;
-    // delta > 0 exactly when s > 0 (65536 / v >= 257).
-    const int s = static_cast<int>(LUT_DELTA[v & 255] * static_cast<uint32_t>(delta));
-    const int k = static_cast<int>(LUT_DELTA2[delta & 255]);
-    // The hue from the channel that holds v (red first, then green), picked
-    // by masks rather than branches: which one holds it looks random along a
-    // row. |k * difference| <= 60 degrees, so the hue is 0..360.
-    const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v), by_b = ~(by_r | by_g);
-    const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
-    fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
-    hf += (hf >> 31) & itofix(360);
-    const HueTurn& e = turn[fixtoi(hf)];
-    const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - s)));
-    const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((s >> 4) * e.f4) >> 8))));
-    const uint32_t turned = (p & 0xFF000000u) | static_cast<uint32_t>(v) << e.sv | mid << e.sm | lo << e.sl;
-    const uint32_t keep = e.keep | (0u - static_cast<uint32_t>(delta == 0));
-    return (p & keep) | (turned & ~keep);
-  }
-};
-
-// The whole-picture turn in short runs of pixels, in three loops: the hue
+// The turn in short runs of pixels, in three loops: the hue
 // index, s and v by arithmetic (floor(65536 / n) for n = 1..255 by a float
 // division: the quotient is never within half a float step of the next
 // integer, so its floor is exact), which vectorises; the table's entries
@@ -148,60 +118,101 @@ inline int floor_65536_over(int n) {  // n = 1..255
   return static_cast<int>(65536.0f / static_cast<float>(n));
 }
 
-void hue_in_runs(const uint32_t* src, uint32_t* dst, int width, int height, const HueTurnTable& table) {
+// The working arrays of one run of at most kHueRun pixels.
+constexpr size_t kHueRun = 256;
+struct HueRun {
+  int32_t hue[kHueRun], sat[kHueRun], val[kHueRun], f4[kHueRun];
+  uint32_t keep[kHueRun], mv[kHueRun], mm[kHueRun], ml[kHueRun];
+
+  // d[0..n) = s[0..n) turned; with a mask, only where its byte is 1 (d gets
+  // s elsewhere). s may be d.
+  void turn(const uint32_t* s, uint32_t* d, size_t n, const HueRunEntry* t, const unsigned char* m) {
+    for (size_t j = 0; j < n; ++j) {
+      const uint32_t p = s[j];
+      const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
+                b = static_cast<int>(p & 255);
+      int v = r > g ? r : g;
+      v = b > v ? b : v;
+      int min = r < g ? r : g;
+      min = b < min ? b : min;
+      const int delta = v - min;
+      // v = 0 or delta = 0: multiplied by delta = 0 or kept below, as the
+      // tables' entry 0 (0) gives.
+      const int sv = floor_65536_over(v > 0 ? v : 1) * delta;
+      const int k = 60 * floor_65536_over(delta > 0 ? delta : 1);
+      const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v), by_b = ~(by_r | by_g);
+      const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
+      fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
+      hf += (hf >> 31) & itofix(360);
+      hue[j] = fixtoi(hf);
+      sat[j] = sv;
+      val[j] = v;
+    }
+    for (size_t j = 0; j < n; ++j) {
+      const HueRunEntry& e = t[hue[j]];
+      keep[j] = e.keep;
+      mv[j] = e.mv;
+      mm[j] = e.mm;
+      ml[j] = e.ml;
+      f4[j] = e.f4;
+    }
+    const auto turned = [&](size_t j, uint32_t p) {
+      const int v = val[j], sv = sat[j];
+      const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - sv)));
+      const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((sv >> 4) * f4[j]) >> 8))));
+      const uint32_t o = (p & 0xFF000000u) | (static_cast<uint32_t>(v) * 0x010101u & mv[j]) |
+                         (mid * 0x010101u & mm[j]) | (lo * 0x010101u & ml[j]);
+      const uint32_t kept = keep[j] | (0u - static_cast<uint32_t>(sv == 0));
+      return (p & kept) | (o & ~kept);
+    };
+    if (!m) {
+      for (size_t j = 0; j < n; ++j) d[j] = turned(j, s[j]);
+    } else {
+      for (size_t j = 0; j < n; ++j) {
+        const uint32_t p = s[j], o = turned(j, p);
+        d[j] = m[j] == 1 ? o : p;
+      }
+    }
+  }
+};
+
+// The turn by the region rule (see px_region.h) in runs: the whole picture
+// for an empty rectangle; otherwise rows outside the rectangle copied and
+// the rectangle's row segments turned where the mask byte is 1.
+void hue_in_runs(const uint32_t* src, const unsigned char* mask, uint32_t* dst, int width, int height, px_rect rect,
+                 const HueTurnTable& table) {
   std::array<HueRunEntry, 361> turn{};
   for (size_t h = 0; h < turn.size(); ++h) {
     const HueTurn& e = table[h];
     turn[h] = {e.keep, 0xFFu << e.sv, 0xFFu << e.sm, 0xFFu << e.sl, e.f4};
   }
   const size_t w = static_cast<size_t>(width);
+  const bool whole = px_rect_empty(rect);
+  const px_rect r = whole ? rect : px_rect_clip(rect, width, height);
+  const bool none = !whole && px_rect_empty(r);
   px_for_rows(height, [&](int y0, int y1) {
-    constexpr size_t kRun = 256;
-    int32_t hue[kRun], sat[kRun], val[kRun], f4[kRun];
-    uint32_t keep[kRun], mv[kRun], mm[kRun], ml[kRun];
+    HueRun run;
     const HueRunEntry* t = turn.data();
-    for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; i += kRun) {
-      const size_t n = end - i < kRun ? end - i : kRun;
-      const uint32_t* s = src + i;
-      uint32_t* d = dst + i;
-      for (size_t j = 0; j < n; ++j) {
-        const uint32_t p = s[j];
-        const int r = static_cast<int>((p >> 16) & 255), g = static_cast<int>((p >> 8) & 255),
-                  b = static_cast<int>(p & 255);
-        int v = r > g ? r : g;
-        v = b > v ? b : v;
-        int min = r < g ? r : g;
-        min = b < min ? b : min;
-        const int delta = v - min;
-        // v = 0 or delta = 0: multiplied by delta = 0 or kept below, as the
-        // tables' entry 0 (0) gives.
-        const int sv = floor_65536_over(v > 0 ? v : 1) * delta;
-        const int k = 60 * floor_65536_over(delta > 0 ? delta : 1);
-        const int by_r = -static_cast<int>(r == v), by_g = ~by_r & -static_cast<int>(g == v), by_b = ~(by_r | by_g);
-        const int diff = (by_r & (g - b)) | (by_g & (b - r)) | (by_b & (r - g));
-        fixed hf = (by_g & itofix(120)) + (by_b & itofix(240)) + k * diff;
-        hf += (hf >> 31) & itofix(360);
-        hue[j] = fixtoi(hf);
-        sat[j] = sv;
-        val[j] = v;
+    if (whole) {
+      for (size_t i = static_cast<size_t>(y0) * w, end = static_cast<size_t>(y1) * w; i < end; i += kHueRun) {
+        run.turn(src + i, dst + i, end - i < kHueRun ? end - i : kHueRun, t, nullptr);
       }
-      for (size_t j = 0; j < n; ++j) {
-        const HueRunEntry& e = t[hue[j]];
-        keep[j] = e.keep;
-        mv[j] = e.mv;
-        mm[j] = e.mm;
-        ml[j] = e.ml;
-        f4[j] = e.f4;
+      return;
+    }
+    for (int y = y0; y < y1; ++y) {
+      const uint32_t* s = src + static_cast<size_t>(y) * w;
+      uint32_t* d = dst + static_cast<size_t>(y) * w;
+      if (none || y < r.top || y > r.bottom) {
+        if (s != d) std::memcpy(d, s, w * 4);
+        continue;
       }
-      for (size_t j = 0; j < n; ++j) {
-        const uint32_t p = s[j];
-        const int v = val[j], sv = sat[j];
-        const uint32_t lo = static_cast<uint32_t>(fixtoi(v * (65536 - sv)));
-        const uint32_t mid = static_cast<uint32_t>(fixtoi(v * (65536 - (((sv >> 4) * f4[j]) >> 8))));
-        const uint32_t turned = (p & 0xFF000000u) | (static_cast<uint32_t>(v) * 0x010101u & mv[j]) |
-                                (mid * 0x010101u & mm[j]) | (lo * 0x010101u & ml[j]);
-        const uint32_t kept = keep[j] | (0u - static_cast<uint32_t>(sv == 0));
-        d[j] = (p & kept) | (turned & ~kept);
+      if (s != d) {
+        std::memcpy(d, s, static_cast<size_t>(r.left) * 4);
+        std::memcpy(d + r.right + 1, s + r.right + 1, (w - static_cast<size_t>(r.right) - 1) * 4);
+      }
+      const unsigned char* m = mask + static_cast<size_t>(y) * w;
+      for (size_t x = static_cast<size_t>(r.left), end = static_cast<size_t>(r.right) + 1; x < end; x += kHueRun) {
+        run.turn(s + x, d + x, end - x < kHueRun ? end - x : kHueRun, t, m + x);
       }
     }
   });
@@ -231,12 +242,9 @@ int rotate_hue(int* in, unsigned char* mask, int* out, int width, int height, in
     px_region_map(in, mask, out, width, height, rect, HueShift{shift});
   } else {
     const HueTurnTable table = hue_turn_table(shift);
-    if (px_rect_empty(rect)) {
-      if (width > 0 && height > 0) {
-        hue_in_runs(reinterpret_cast<const uint32_t*>(in), reinterpret_cast<uint32_t*>(out), width, height, table);
-      }
-    } else {
-      px_region_map(in, mask, out, width, height, rect, HueShiftTable{table.data()});
+    if (width > 0 && height > 0) {
+      hue_in_runs(reinterpret_cast<const uint32_t*>(in), mask, reinterpret_cast<uint32_t*>(out), width, height, rect,
+                  table);
     }
   }
   return PX_OK;
