@@ -199,6 +199,41 @@ void blur(Job& job, const uint32_t* src, const uint32_t* alpha, uint32_t* dst, i
   }
 }
 
+// Reduced row j for blocks of 2 x 2 (k = 2) with both rows inside the
+// picture: the same rounded means, (sum + 2) >> 2 a lane, two blocks at a
+// time. A 64-bit lane holds one block's two pixels of a row; masking every
+// other byte spreads them into 16-bit fields (blue and red, or green and
+// alpha, of both pixels), the rows and then the lane's halves are added, and
+// the low half holds the block's four sums. The last block of an odd width
+// goes the general way.
+typedef uint64_t u64x2 __attribute__((vector_size(16)));
+void reduce_pairs(const Job& job, int j) {
+  const auto* r0 = reinterpret_cast<const uint8_t*>(job.src + static_cast<size_t>(2 * j) * job.w);
+  const auto* r1 = r0 + static_cast<size_t>(job.w) * 4;
+  uint32_t* out = job.reduced + static_cast<size_t>(j) * job.rw;
+  const int full_blocks = job.w / 2;
+  const u64x2 mask = u64x2{} + 0x00FF00FF00FF00FFull, round = u64x2{} + 0x0002000200020002ull;
+  int i = 0;
+  for (; i + 2 <= full_blocks; i += 2) {
+    u64x2 a, b;
+    std::memcpy(&a, r0 + 8 * i, 16);
+    std::memcpy(&b, r1 + 8 * i, 16);
+    u64x2 lo = (a & mask) + (b & mask), hi = ((a >> 8) & mask) + ((b >> 8) & mask);
+    lo = (((lo + (lo >> 32)) + round) >> 2) & mask;
+    hi = (((hi + (hi >> 32)) + round) >> 2) & mask;
+    const u64x2 px = lo | hi << 8;
+    out[i] = 0xFF000000u | static_cast<uint32_t>(px[0]);
+    out[i + 1] = 0xFF000000u | static_cast<uint32_t>(px[1]);
+  }
+  for (; i < full_blocks; ++i) {
+    const uint8_t* a = r0 + 8 * i;
+    const uint8_t* b = r1 + 8 * i;
+    uint32_t v = 0xFF000000u;
+    for (int c = 0; c < 3; ++c) v |= static_cast<uint32_t>((a[c] + a[c + 4] + b[c] + b[c + 4] + 2) >> 2) << (8 * c);
+    out[i] = v;
+  }
+}
+
 // Reduced rows j0..j1: the rounded means of the k x k blocks. The column
 // sums of a block row fit 16 bits (k <= 67).
 void reduce(Job& job, int j0, int j1) {
@@ -207,6 +242,11 @@ void reduce(Job& job, int j0, int j1) {
   const int lanes = 4 * w;
   for (int j = j0; j < j1; ++j) {
     const int y0 = j * k, y1 = y0 + k < job.h ? y0 + k : job.h;
+    const bool pairs = k == 2 && y1 - y0 == 2 && !px_scalar_only();
+    if (pairs) {
+      reduce_pairs(job, j);
+      if (w % 2 == 0) continue;  // otherwise the last block below
+    }
     std::memset(sums, 0, static_cast<size_t>(lanes) * 2);
     for (int y = y0; y < y1; ++y) {
       const auto* row = reinterpret_cast<const uint8_t*>(job.src + static_cast<size_t>(y) * w);
@@ -228,7 +268,7 @@ void reduce(Job& job, int j0, int j1) {
       full_shift = 0;
       while ((1u << full_shift) < full) ++full_shift;
     }
-    for (int i = 0; i < job.rw; ++i) {
+    for (int i = pairs ? w / 2 : 0; i < job.rw; ++i) {
       const int x0 = i * k, x1 = x0 + k < w ? x0 + k : w;
       const uint32_t count = static_cast<uint32_t>((x1 - x0) * (y1 - y0));
       const uint32_t rec = count == full ? full_rec : (count > 1 ? reciprocal_of(count) : 0);
