@@ -79,7 +79,7 @@ void VariableBlur(benchmark::State& s) {
   });
 }
 BENCHMARK(VariableBlur)
-    ->ArgsProduct({{1, 12}, {3, 7, 15, 63}})
+    ->ArgsProduct({{1, 12}, {1, 2, 3, 4, 5, 6, 7, 8, 9, 11, 15, 63}})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime();
 

@@ -8,16 +8,16 @@
 // is kept as 8-bit values for the vertical direction. Borders repeat the
 // edge pixel.
 //
-// Radii up to kDirectRadius (4) blur at full size with q = r. Larger radii
+// Radii up to kDirectRadius (3) blur at full size with q = r. Larger radii
 // blur a reduced picture: blocks of k x k pixels, k = max(2, round(2r / 9)),
 // become their rounded means (the blocks of the last column and row may be
 // smaller), the reduced picture is blurred with q = 3 (q = 2 for radii 5 to
-// 8, whose blocks are 2 x 2: a sigma nearer r / 3, and less work), and every
-// output pixel is interpolated bilinearly from the blurred blocks around its centre
+// 8 and q = 1 for radius 4, whose blocks are 2 x 2: a sigma nearer r / 3, and
+// less work), and every output pixel is interpolated bilinearly from the blurred blocks around its centre
 // (pixel x lies at block coordinate (x + 0.5) / k - 0.5, clamped at the
 // borders; the weights are that position in 256ths, across first, each
 // direction rounded). The three steps add up to a sigma of about 1.3 k
-// (q = 3) or 1.1 k (q = 2), near r / 3, and an impulse spreads at most r + 2 pixels
+// (q = 3), 1.1 k (q = 2) or 0.85 k (q = 1), near r / 3, and an impulse spreads at most r + 2 pixels
 // (k (q + 1) + (k - 1) / 2 of them); a constant picture stays constant. So
 // above the direct radii the cost is one reduction and one interpolation of
 // the picture whatever the radius.
@@ -43,9 +43,9 @@
 
 namespace {
 constexpr int kMaxRadius = 300;
-constexpr int kDirectRadius = 4;   // larger radii blur a reduced picture
+constexpr int kDirectRadius = 3;   // larger radii blur a reduced picture
 constexpr int kReducedRadius = 3;  // the blur of the reduced picture
-constexpr int kSmallReduced = 8;   // up to this radius the reduced picture blurs with q = 2
+constexpr int kSmallReduced = 8;   // up to this radius the reduced picture blurs with q = 2 (radius 4: q = 1)
 constexpr int kMinRowsPerBand = 16;
 
 // Eight byte lanes widened to 16 bits (GCC/Clang vector extensions: SSE2
@@ -77,7 +77,7 @@ inline void store8_alpha(uint8_t* p, u16x8 v, const uint8_t* a) {
 }
 
 // The binomial kernel of radius Q: C(2Q, j) for j = 0..2Q, summing to 4^Q
-// (at most 256: Q <= 4).
+// (at most 64: Q <= 3).
 template <int Q>
 constexpr std::array<uint16_t, 2 * Q + 1> binomial() {
   std::array<uint16_t, 2 * Q + 1> w{};
@@ -194,8 +194,7 @@ void blur(Job& job, const uint32_t* src, const uint32_t* alpha, uint32_t* dst, i
   switch (q) {
     case 1: blur_band<1>(src, alpha, dst, w, h, y0, y1, work); break;
     case 2: blur_band<2>(src, alpha, dst, w, h, y0, y1, work); break;
-    case 3: blur_band<3>(src, alpha, dst, w, h, y0, y1, work); break;
-    default: blur_band<4>(src, alpha, dst, w, h, y0, y1, work); break;
+    default: blur_band<3>(src, alpha, dst, w, h, y0, y1, work); break;
   }
 }
 
@@ -396,7 +395,7 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   if (radius > kMaxRadius) radius = kMaxRadius;
   Job job{src, src, dst, w, h, radius, 1, w, h, nullptr, nullptr, {}, nullptr, 0};
   if (radius > kDirectRadius) {
-    job.q = radius <= kSmallReduced ? kReducedRadius - 1 : kReducedRadius;
+    job.q = radius <= kSmallReduced ? (radius == kDirectRadius + 1 ? 1 : kReducedRadius - 1) : kReducedRadius;
     job.k = (2 * radius + 4) / 9 > 2 ? (2 * radius + 4) / 9 : 2;
     job.rw = (w + job.k - 1) / job.k;
     job.rh = (h + job.k - 1) / job.k;
