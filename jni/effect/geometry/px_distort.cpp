@@ -76,21 +76,48 @@ Span span(int lo, int hi, int limit, int step) {
   return {static_cast<int>(first), static_cast<int>((last - first) / step + 1)};
 }
 
-// Runs fn(x, y) over the visited positions of the rectangle, row groups on
-// worker threads. Each visited row writes only its own row (and, in half
-// resolution, the row below it, which is never visited), so the result does
-// not depend on the split.
-template <class Fn>
-void visit(int width, int height, int left, int right, int top, int bottom, bool half, Fn fn) {
+// Where a visited pixel samples the source: (xi + fx / 2048, yi + fy / 2048).
+struct Sample {
+  int x, xi, yi, fx, fy;
+};
+
+// Runs map(x, y, &sample) over the visited positions of the rectangle, row
+// groups on worker threads; map says whether (x, y) is moved and from where.
+// The samples of up to kChunk visited pixels of a row are worked out first
+// (their source rows fetched ahead), then read and written: the reads of
+// scattered source rows overlap instead of waiting one by one. Each visited
+// row writes only its own row (and, in half resolution, the row below it,
+// which is never visited), so the result does not depend on the split.
+constexpr int kChunk = 128;
+template <class Map>
+void visit_sampled(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom,
+                   bool half, Map map) {
   const int step = half ? 2 : 1;
   const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
   if (rows.count == 0 || cols.count == 0) return;
   px_for_rows(
       rows.count,
       [&](int r0, int r1) {
+        Sample buf[kChunk];
         for (int r = r0; r < r1; ++r) {
           const int y = rows.first + r * step;
-          for (int c = 0, x = cols.first; c < cols.count; ++c, x += step) fn(x, y);
+          for (int c0 = 0; c0 < cols.count; c0 += kChunk) {
+            const int c1 = c0 + kChunk < cols.count ? c0 + kChunk : cols.count;
+            int n = 0;
+            for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
+              Sample& sm = buf[n];
+              if (!map(x, y, sm)) continue;
+              sm.x = x;
+              const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
+              __builtin_prefetch(src + at(px, py, width));
+              __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
+              ++n;
+            }
+            for (int i = 0; i < n; ++i) {
+              const Sample& sm = buf[i];
+              put(src, dst, width, height, sm.x, y, sample(src, width, height, sm.xi, sm.yi, sm.fx, sm.fy), half);
+            }
+          }
         }
       },
       half ? 32 : 64);
@@ -248,12 +275,12 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
   const int r2 = radius * radius;
   if (r2 <= 0) return PX_OK;  // the square wrapped past 32 bits: no pixel is inside
   const int per = 0x40000000 / r2;
-  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
-    if (d2 >= r2) return;
+    if (d2 >= r2) return false;
     const int t = d2 * per;
-    if (t < 0 || t >= 0x40000000) return;  // reached only through wrapped sizes
+    if (t < 0 || t >= 0x40000000) return false;  // reached only through wrapped sizes
     const int s = sqrt_step(t);
     const int D = s * radius;
     int w = (0x80000 - s) * angle;
@@ -275,8 +302,8 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
       sn = -SIN[16384 - k];
     }
     const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
-    put(src, dst, width, height, x, y, sample(src, width, height, ax.whole, ay.whole, ax.weight, ay.weight),
-        half != 0);
+    sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+    return true;
   });
   return PX_OK;
 }
@@ -310,10 +337,10 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       steps[i] = {m, Dn, 0x40000000 / Dn, divisor_of(static_cast<uint32_t>(Dn))};
     }
   }
-  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
-    if (d2 > R2) return;
+    if (d2 > R2) return false;
     const int i = (per * d2) >> 22;
     const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
     int xi, yi, fx, fy;
@@ -344,7 +371,8 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
       fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
     }
-    put(src, dst, width, height, x, y, sample(src, width, height, xi, yi, fx, fy), half != 0);
+    sm = {x, xi, yi, fx, fy};
+    return true;
   });
   return PX_OK;
 }
