@@ -2,6 +2,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "../kalo/px_mem.h"
 #include "../kalo/px_parallel.h"
 #include "../px_types.h"
 #include "px_geometry.h"
@@ -139,7 +140,7 @@ struct Axis {
 // centre + D * trig, where D is a distance in 2^19 units and trig a Q15
 // sine or cosine. The middle and low bytes of D are deliberately weighted
 // above their place value; this is the twirl's look and is kept.
-Axis twirl_offset(int center, int D, int trig) {
+inline Axis twirl_offset(int center, int D, int trig) {
   const int c = trig < 0 ? -trig : trig;
   const int hi = D >> 16, mid = (D >> 8) & 0xFF, lo = D & 0xFF;
   const int A = lo * c, B = mid * c, H = hi * c;
@@ -240,19 +241,27 @@ int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidt
 
 // ---- twirl and sphericity -------------------------------------------------------
 
-int FATAN2(int x, int y) {
+namespace {
+// FATAN2 with the quotient 0x20000000 / big supplied by `quotient(big)`.
+template <class Quotient>
+inline int fatan2_with(int x, int y, Quotient quotient) {
   if (y == 0) return x > 0 ? 90 * kDeg : (x < 0 ? 270 * kDeg : 0);
   if (x == 0) return y > 0 ? 0 : 180 * kDeg;
   const uint32_t ax = x < 0 ? 0u - static_cast<uint32_t>(x) : static_cast<uint32_t>(x);
   const uint32_t ay = y < 0 ? 0u - static_cast<uint32_t>(y) : static_cast<uint32_t>(y);
   const uint32_t big = ax > ay ? ax : ay, small = ax > ay ? ay : ax;
-  const uint32_t i = (small * (0x20000000u / big)) >> 18;
+  const uint32_t i = (small * quotient(big)) >> 18;
   int a = i >= 2048 ? 45 * kDeg : ATAN[i];
   if (ay < ax) a = 90 * kDeg - a;
   if (x >= 0 && y >= 0) return a;
   if (y > 0 && x < 0) return kTurn - a;
   if (x > 0 && y < 0) return 180 * kDeg - a;
   return a + 180 * kDeg;
+}
+}  // namespace
+
+int FATAN2(int x, int y) {
+  return fatan2_with(x, y, [](uint32_t big) { return 0x20000000u / big; });
 }
 
 uint32_t Bilinear_Fixed(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
@@ -275,6 +284,15 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
   const int r2 = radius * radius;
   if (r2 <= 0) return PX_OK;  // the square wrapped past 32 bits: no pixel is inside
   const int per = 0x40000000 / r2;
+  // The angle's quotient 0x20000000 / max(|dx|, |dy|): on the fast path from
+  // a table of every such distance (both below the longer side), the same
+  // quotients without a division per pixel.
+  const int longer = width > height ? width : height;
+  uint32_t* quotients = px_scalar_only() ? nullptr : static_cast<uint32_t*>(px_malloc(static_cast<size_t>(longer), 4));
+  if (quotients) {
+    quotients[0] = 0;  // never read: big is 0 only where the angle needs no quotient
+    for (int d = 1; d < longer; ++d) quotients[d] = 0x20000000u / static_cast<uint32_t>(d);
+  }
   visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
@@ -285,7 +303,8 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     const int D = s * radius;
     int w = (0x80000 - s) * angle;
     if (angle < 0) w += kTurn;
-    const uint32_t theta = static_cast<uint32_t>(w + FATAN2(dx, dy)) % static_cast<uint32_t>(kTurn);
+    const int angle_of = quotients ? fatan2_with(dx, dy, [&](uint32_t big) { return quotients[big]; }) : FATAN2(dx, dy);
+    const uint32_t theta = static_cast<uint32_t>(w + angle_of) % static_cast<uint32_t>(kTurn);
     const int k = static_cast<int>(theta / 360) >> 5;
     int sn, cs;
     if (k <= 4096) {
@@ -305,6 +324,7 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
     return true;
   });
+  px_free(quotients);
   return PX_OK;
 }
 
