@@ -21,18 +21,18 @@ void copy_row(int* dst, const int* src, int count) {
 int clamp(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
 // Bilinear_Fixed's arithmetic, inlined into the samplers.
+// The three channels written out (gcc keeps the loop over them rolled).
 inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
                          uint32_t bottomRight) {
-  uint32_t result = 0xFF000000u;
-  for (int shift = 16; shift >= 0; shift -= 8) {
+  auto channel = [&](int shift) {
     const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
     const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
     const int top = tr * fx + tl * (2048 - fx);
     const int bottom = br * fx + bl * (2048 - fx);
     const int value = ((2048 - fy) * top + fy * bottom) >> 22;
-    result |= static_cast<uint32_t>(value & 255) << shift;
-  }
-  return result;
+    return static_cast<uint32_t>(value & 255) << shift;
+  };
+  return 0xFF000000u | channel(16) | channel(8) | channel(0);
 }
 
 // The pixel at a sub-pixel position (xi + fx / 2048, yi + fy / 2048), its
@@ -52,7 +52,7 @@ inline uint32_t sample(const int* src, int width, int height, int xi, int yi, in
 // Writes an interpolated colour at (x, y) with that pixel's alpha; in half
 // resolution also at its right, lower and diagonal neighbours (with the same
 // alpha of (x, y)) where they are inside the picture.
-void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
+inline void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
   const uint32_t alpha = static_cast<uint32_t>(src[at(x, y, width)]) & 0xFF000000u;
   const int v = static_cast<int>(alpha | (colour & 0xFFFFFFu));
   dst[at(x, y, width)] = v;
