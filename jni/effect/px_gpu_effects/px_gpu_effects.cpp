@@ -538,7 +538,23 @@ void impressionist_fast(const int* in, int* out, const int* strokes, const int* 
   px_for_rows(height, [&](int y0, int y1) {
     for (int y = y0; y < y1; ++y) {
       const size_t row = static_cast<size_t>(y) * w;
-      for (int x = 0; x < width; ++x) {
+      int x = 0;
+      for (; x + 1 < width; x += 2) {  // two pixels a time, one a lane
+        const uint32_t t0 = static_cast<uint32_t>(strokes[row + x]), t1 = static_cast<uint32_t>(strokes[row + x + 1]);
+        const uint32_t p0 = at(in, width, height, x + move[(t0 >> 16) & 255], y + move[t0 & 255]);
+        const uint32_t p1 = at(in, width, height, x + 1 + move[(t1 >> 16) & 255], y + move[t1 & 255]);
+        const f64x2 r{u[(p0 >> 16) & 255], u[(p1 >> 16) & 255]}, g{u[(p0 >> 8) & 255], u[(p1 >> 8) & 255]},
+            b{u[p0 & 255], u[p1 & 255]};
+        const f64x2 l = 0.299 * r + 0.587 * g + 0.114 * b;  // saturate(c, 1.3)
+        const f64x2 lr = trunc_lanes(clamp_lanes(l + (r - l) * 1.3, 0.0f, 1.0f) * 7.0 + 0.5);
+        const f64x2 lg = trunc_lanes(clamp_lanes(l + (g - l) * 1.3, 0.0f, 1.0f) * 7.0 + 0.5);
+        const f64x2 lb = trunc_lanes(clamp_lanes(l + (b - l) * 1.3, 0.0f, 1.0f) * 7.0 + 0.5);
+        for (int k = 0; k < 2; ++k) {
+          work[row + x + k] = static_cast<uint16_t>(static_cast<uint32_t>(lr[k]) << 6 |
+                                                    static_cast<uint32_t>(lg[k]) << 3 | static_cast<uint32_t>(lb[k]));
+        }
+      }
+      for (; x < width; ++x) {
         const uint32_t t = static_cast<uint32_t>(strokes[row + x]);
         const uint32_t p = at(in, width, height, x + move[(t >> 16) & 255], y + move[t & 255]);
         const Col c = saturate({u[(p >> 16) & 255], u[(p >> 8) & 255], u[p & 255]}, 1.3);
