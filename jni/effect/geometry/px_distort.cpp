@@ -2,6 +2,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "../kalo/px_mem.h"
 #include "../kalo/px_parallel.h"
 #include "../px_types.h"
 #include "px_geometry.h"
@@ -20,18 +21,18 @@ void copy_row(int* dst, const int* src, int count) {
 int clamp(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
 // Bilinear_Fixed's arithmetic, inlined into the samplers.
+// The three channels written out (gcc keeps the loop over them rolled).
 inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
                          uint32_t bottomRight) {
-  uint32_t result = 0xFF000000u;
-  for (int shift = 16; shift >= 0; shift -= 8) {
+  auto channel = [&](int shift) {
     const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
     const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
     const int top = tr * fx + tl * (2048 - fx);
     const int bottom = br * fx + bl * (2048 - fx);
     const int value = ((2048 - fy) * top + fy * bottom) >> 22;
-    result |= static_cast<uint32_t>(value & 255) << shift;
-  }
-  return result;
+    return static_cast<uint32_t>(value & 255) << shift;
+  };
+  return 0xFF000000u | channel(16) | channel(8) | channel(0);
 }
 
 // The pixel at a sub-pixel position (xi + fx / 2048, yi + fy / 2048), its
@@ -51,7 +52,7 @@ inline uint32_t sample(const int* src, int width, int height, int xi, int yi, in
 // Writes an interpolated colour at (x, y) with that pixel's alpha; in half
 // resolution also at its right, lower and diagonal neighbours (with the same
 // alpha of (x, y)) where they are inside the picture.
-void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
+inline void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
   const uint32_t alpha = static_cast<uint32_t>(src[at(x, y, width)]) & 0xFF000000u;
   const int v = static_cast<int>(alpha | (colour & 0xFFFFFFu));
   dst[at(x, y, width)] = v;
@@ -76,21 +77,48 @@ Span span(int lo, int hi, int limit, int step) {
   return {static_cast<int>(first), static_cast<int>((last - first) / step + 1)};
 }
 
-// Runs fn(x, y) over the visited positions of the rectangle, row groups on
-// worker threads. Each visited row writes only its own row (and, in half
-// resolution, the row below it, which is never visited), so the result does
-// not depend on the split.
-template <class Fn>
-void visit(int width, int height, int left, int right, int top, int bottom, bool half, Fn fn) {
+// Where a visited pixel samples the source: (xi + fx / 2048, yi + fy / 2048).
+struct Sample {
+  int x, xi, yi, fx, fy;
+};
+
+// Runs map(x, y, &sample) over the visited positions of the rectangle, row
+// groups on worker threads; map says whether (x, y) is moved and from where.
+// The samples of up to kChunk visited pixels of a row are worked out first
+// (their source rows fetched ahead), then read and written: the reads of
+// scattered source rows overlap instead of waiting one by one. Each visited
+// row writes only its own row (and, in half resolution, the row below it,
+// which is never visited), so the result does not depend on the split.
+constexpr int kChunk = 128;
+template <class Map>
+void visit_sampled(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom,
+                   bool half, Map map) {
   const int step = half ? 2 : 1;
   const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
   if (rows.count == 0 || cols.count == 0) return;
   px_for_rows(
       rows.count,
       [&](int r0, int r1) {
+        Sample buf[kChunk];
         for (int r = r0; r < r1; ++r) {
           const int y = rows.first + r * step;
-          for (int c = 0, x = cols.first; c < cols.count; ++c, x += step) fn(x, y);
+          for (int c0 = 0; c0 < cols.count; c0 += kChunk) {
+            const int c1 = c0 + kChunk < cols.count ? c0 + kChunk : cols.count;
+            int n = 0;
+            for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
+              Sample& sm = buf[n];
+              if (!map(x, y, sm)) continue;
+              sm.x = x;
+              const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
+              __builtin_prefetch(src + at(px, py, width));
+              __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
+              ++n;
+            }
+            for (int i = 0; i < n; ++i) {
+              const Sample& sm = buf[i];
+              put(src, dst, width, height, sm.x, y, sample(src, width, height, sm.xi, sm.yi, sm.fx, sm.fy), half);
+            }
+          }
         }
       },
       half ? 32 : 64);
@@ -112,7 +140,7 @@ struct Axis {
 // centre + D * trig, where D is a distance in 2^19 units and trig a Q15
 // sine or cosine. The middle and low bytes of D are deliberately weighted
 // above their place value; this is the twirl's look and is kept.
-Axis twirl_offset(int center, int D, int trig) {
+inline Axis twirl_offset(int center, int D, int trig) {
   const int c = trig < 0 ? -trig : trig;
   const int hi = D >> 16, mid = (D >> 8) & 0xFF, lo = D & 0xFF;
   const int A = lo * c, B = mid * c, H = hi * c;
@@ -213,19 +241,27 @@ int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidt
 
 // ---- twirl and sphericity -------------------------------------------------------
 
-int FATAN2(int x, int y) {
+namespace {
+// FATAN2 with the quotient 0x20000000 / big supplied by `quotient(big)`.
+template <class Quotient>
+inline int fatan2_with(int x, int y, Quotient quotient) {
   if (y == 0) return x > 0 ? 90 * kDeg : (x < 0 ? 270 * kDeg : 0);
   if (x == 0) return y > 0 ? 0 : 180 * kDeg;
   const uint32_t ax = x < 0 ? 0u - static_cast<uint32_t>(x) : static_cast<uint32_t>(x);
   const uint32_t ay = y < 0 ? 0u - static_cast<uint32_t>(y) : static_cast<uint32_t>(y);
   const uint32_t big = ax > ay ? ax : ay, small = ax > ay ? ay : ax;
-  const uint32_t i = (small * (0x20000000u / big)) >> 18;
+  const uint32_t i = (small * quotient(big)) >> 18;
   int a = i >= 2048 ? 45 * kDeg : ATAN[i];
   if (ay < ax) a = 90 * kDeg - a;
   if (x >= 0 && y >= 0) return a;
   if (y > 0 && x < 0) return kTurn - a;
   if (x > 0 && y < 0) return 180 * kDeg - a;
   return a + 180 * kDeg;
+}
+}  // namespace
+
+int FATAN2(int x, int y) {
+  return fatan2_with(x, y, [](uint32_t big) { return 0x20000000u / big; });
 }
 
 uint32_t Bilinear_Fixed(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
@@ -248,17 +284,27 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
   const int r2 = radius * radius;
   if (r2 <= 0) return PX_OK;  // the square wrapped past 32 bits: no pixel is inside
   const int per = 0x40000000 / r2;
-  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+  // The angle's quotient 0x20000000 / max(|dx|, |dy|): on the fast path from
+  // a table of every such distance (both below the longer side), the same
+  // quotients without a division per pixel.
+  const int longer = width > height ? width : height;
+  uint32_t* quotients = px_scalar_only() ? nullptr : static_cast<uint32_t*>(px_malloc(static_cast<size_t>(longer), 4));
+  if (quotients) {
+    quotients[0] = 0;  // never read: big is 0 only where the angle needs no quotient
+    for (int d = 1; d < longer; ++d) quotients[d] = 0x20000000u / static_cast<uint32_t>(d);
+  }
+  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
-    if (d2 >= r2) return;
+    if (d2 >= r2) return false;
     const int t = d2 * per;
-    if (t < 0 || t >= 0x40000000) return;  // reached only through wrapped sizes
+    if (t < 0 || t >= 0x40000000) return false;  // reached only through wrapped sizes
     const int s = sqrt_step(t);
     const int D = s * radius;
     int w = (0x80000 - s) * angle;
     if (angle < 0) w += kTurn;
-    const uint32_t theta = static_cast<uint32_t>(w + FATAN2(dx, dy)) % static_cast<uint32_t>(kTurn);
+    const int angle_of = quotients ? fatan2_with(dx, dy, [&](uint32_t big) { return quotients[big]; }) : FATAN2(dx, dy);
+    const uint32_t theta = static_cast<uint32_t>(w + angle_of) % static_cast<uint32_t>(kTurn);
     const int k = static_cast<int>(theta / 360) >> 5;
     int sn, cs;
     if (k <= 4096) {
@@ -275,9 +321,10 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
       sn = -SIN[16384 - k];
     }
     const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
-    put(src, dst, width, height, x, y, sample(src, width, height, ax.whole, ay.whole, ax.weight, ay.weight),
-        half != 0);
+    sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+    return true;
   });
+  px_free(quotients);
   return PX_OK;
 }
 
@@ -310,10 +357,10 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       steps[i] = {m, Dn, 0x40000000 / Dn, divisor_of(static_cast<uint32_t>(Dn))};
     }
   }
-  visit(width, height, left, right, top, bottom, half != 0, [&](int x, int y) {
+  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
-    if (d2 > R2) return;
+    if (d2 > R2) return false;
     const int i = (per * d2) >> 22;
     const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
     int xi, yi, fx, fy;
@@ -344,7 +391,8 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
       fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
     }
-    put(src, dst, width, height, x, y, sample(src, width, height, xi, yi, fx, fy), half != 0);
+    sm = {x, xi, yi, fx, fy};
+    return true;
   });
   return PX_OK;
 }

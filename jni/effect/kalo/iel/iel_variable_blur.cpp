@@ -8,16 +8,16 @@
 // is kept as 8-bit values for the vertical direction. Borders repeat the
 // edge pixel.
 //
-// Radii up to kDirectRadius (4) blur at full size with q = r. Larger radii
+// Radii up to kDirectRadius (3) blur at full size with q = r. Larger radii
 // blur a reduced picture: blocks of k x k pixels, k = max(2, round(2r / 9)),
 // become their rounded means (the blocks of the last column and row may be
 // smaller), the reduced picture is blurred with q = 3 (q = 2 for radii 5 to
-// 8, whose blocks are 2 x 2: a sigma nearer r / 3, and less work), and every
-// output pixel is interpolated bilinearly from the blurred blocks around its centre
+// 8 and q = 1 for radius 4, whose blocks are 2 x 2: a sigma nearer r / 3, and
+// less work), and every output pixel is interpolated bilinearly from the blurred blocks around its centre
 // (pixel x lies at block coordinate (x + 0.5) / k - 0.5, clamped at the
 // borders; the weights are that position in 256ths, across first, each
 // direction rounded). The three steps add up to a sigma of about 1.3 k
-// (q = 3) or 1.1 k (q = 2), near r / 3, and an impulse spreads at most r + 2 pixels
+// (q = 3), 1.1 k (q = 2) or 0.85 k (q = 1), near r / 3, and an impulse spreads at most r + 2 pixels
 // (k (q + 1) + (k - 1) / 2 of them); a constant picture stays constant. So
 // above the direct radii the cost is one reduction and one interpolation of
 // the picture whatever the radius.
@@ -43,9 +43,9 @@
 
 namespace {
 constexpr int kMaxRadius = 300;
-constexpr int kDirectRadius = 4;   // larger radii blur a reduced picture
+constexpr int kDirectRadius = 3;   // larger radii blur a reduced picture
 constexpr int kReducedRadius = 3;  // the blur of the reduced picture
-constexpr int kSmallReduced = 8;   // up to this radius the reduced picture blurs with q = 2
+constexpr int kSmallReduced = 8;   // up to this radius the reduced picture blurs with q = 2 (radius 4: q = 1)
 constexpr int kMinRowsPerBand = 16;
 
 // Eight byte lanes widened to 16 bits (GCC/Clang vector extensions: SSE2
@@ -56,11 +56,26 @@ typedef uint16_t u16x4 __attribute__((vector_size(8)));
 typedef uint32_t u32x4 __attribute__((vector_size(16)));
 typedef uint32_t u32x2 __attribute__((vector_size(8)));
 
+// gcc on x86 lowers the widening conversion into two loads and shuffles per
+// lane group; an interleave with zero bytes (one load, one PUNPCKLBW) gives
+// the same lanes.
+#if defined(__SSE2__) && !defined(__clang__)
+typedef uint8_t u8x16 __attribute__((vector_size(16)));
+typedef uint64_t u64x2l __attribute__((vector_size(16)));
+inline u16x8 load8(const uint8_t* p) {
+  uint64_t bits;
+  std::memcpy(&bits, p, 8);
+  const u8x16 v = reinterpret_cast<u8x16>(u64x2l{bits, 0});
+  return reinterpret_cast<u16x8>(
+      __builtin_shufflevector(v, u8x16{}, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23));
+}
+#else
 inline u16x8 load8(const uint8_t* p) {
   u8x8 v;
   std::memcpy(&v, p, 8);
   return __builtin_convertvector(v, u16x8);
 }
+#endif
 inline void store8(uint8_t* p, u16x8 v) {
   const u8x8 b = __builtin_convertvector(v, u8x8);
   std::memcpy(p, &b, 8);
@@ -77,7 +92,7 @@ inline void store8_alpha(uint8_t* p, u16x8 v, const uint8_t* a) {
 }
 
 // The binomial kernel of radius Q: C(2Q, j) for j = 0..2Q, summing to 4^Q
-// (at most 256: Q <= 4).
+// (at most 64: Q <= 3).
 template <int Q>
 constexpr std::array<uint16_t, 2 * Q + 1> binomial() {
   std::array<uint16_t, 2 * Q + 1> w{};
@@ -87,6 +102,16 @@ constexpr std::array<uint16_t, 2 * Q + 1> binomial() {
   }
   return w;
 }
+
+// The taps of a kernel unrolled (gcc's -O2 keeps such short loops rolled and
+// then reloads the weights and the lanes at every tap).
+#if defined(__clang__)
+#define PX_UNROLL _Pragma("clang loop unroll(full)")
+#elif defined(__GNUC__)
+#define PX_UNROLL _Pragma("GCC unroll 8")
+#else
+#define PX_UNROLL
+#endif
 
 inline int clamp_index(int i, int n) { return i < 0 ? 0 : (i >= n ? n - 1 : i); }
 
@@ -110,7 +135,7 @@ void blur_row(const uint8_t* in, uint8_t* out, int n) {
   for (; x + 2 <= inner1; x += 2) {
     const uint8_t* p = in + 4 * x;
     u16x8 s = u16x8{} + half + W[Q] * load8(p);
-    for (int j = 0; j < Q; ++j) s += W[j] * (load8(p + 4 * (j - Q)) + load8(p + 4 * (Q - j)));
+    PX_UNROLL for (int j = 0; j < Q; ++j) s += W[j] * (load8(p + 4 * (j - Q)) + load8(p + 4 * (Q - j)));
     store8(out + 4 * x, s >> shift);
   }
   for (; x < n; ++x) edge(x);
@@ -126,7 +151,7 @@ void blur_column(const uint8_t* const* rows, uint8_t* out, const uint8_t* alpha,
   int i = 0;
   for (; i + 8 <= bytes; i += 8) {
     u16x8 s = u16x8{} + half + W[Q] * load8(rows[Q] + i);
-    for (int j = 0; j < Q; ++j) s += W[j] * (load8(rows[j] + i) + load8(rows[2 * Q - j] + i));
+    PX_UNROLL for (int j = 0; j < Q; ++j) s += W[j] * (load8(rows[j] + i) + load8(rows[2 * Q - j] + i));
     store8_alpha(out + i, s >> shift, alpha + i);
   }
   for (; i < bytes; ++i) {
@@ -194,8 +219,42 @@ void blur(Job& job, const uint32_t* src, const uint32_t* alpha, uint32_t* dst, i
   switch (q) {
     case 1: blur_band<1>(src, alpha, dst, w, h, y0, y1, work); break;
     case 2: blur_band<2>(src, alpha, dst, w, h, y0, y1, work); break;
-    case 3: blur_band<3>(src, alpha, dst, w, h, y0, y1, work); break;
-    default: blur_band<4>(src, alpha, dst, w, h, y0, y1, work); break;
+    default: blur_band<3>(src, alpha, dst, w, h, y0, y1, work); break;
+  }
+}
+
+// Reduced row j for blocks of 2 x 2 (k = 2) with both rows inside the
+// picture: the same rounded means, (sum + 2) >> 2 a lane, two blocks at a
+// time. A 64-bit lane holds one block's two pixels of a row; masking every
+// other byte spreads them into 16-bit fields (blue and red, or green and
+// alpha, of both pixels), the rows and then the lane's halves are added, and
+// the low half holds the block's four sums. The last block of an odd width
+// goes the general way.
+typedef uint64_t u64x2 __attribute__((vector_size(16)));
+void reduce_pairs(const Job& job, int j) {
+  const auto* r0 = reinterpret_cast<const uint8_t*>(job.src + static_cast<size_t>(2 * j) * job.w);
+  const auto* r1 = r0 + static_cast<size_t>(job.w) * 4;
+  uint32_t* out = job.reduced + static_cast<size_t>(j) * job.rw;
+  const int full_blocks = job.w / 2;
+  const u64x2 mask = u64x2{} + 0x00FF00FF00FF00FFull, round = u64x2{} + 0x0002000200020002ull;
+  int i = 0;
+  for (; i + 2 <= full_blocks; i += 2) {
+    u64x2 a, b;
+    std::memcpy(&a, r0 + 8 * i, 16);
+    std::memcpy(&b, r1 + 8 * i, 16);
+    u64x2 lo = (a & mask) + (b & mask), hi = ((a >> 8) & mask) + ((b >> 8) & mask);
+    lo = (((lo + (lo >> 32)) + round) >> 2) & mask;
+    hi = (((hi + (hi >> 32)) + round) >> 2) & mask;
+    const u64x2 px = lo | hi << 8;
+    out[i] = 0xFF000000u | static_cast<uint32_t>(px[0]);
+    out[i + 1] = 0xFF000000u | static_cast<uint32_t>(px[1]);
+  }
+  for (; i < full_blocks; ++i) {
+    const uint8_t* a = r0 + 8 * i;
+    const uint8_t* b = r1 + 8 * i;
+    uint32_t v = 0xFF000000u;
+    for (int c = 0; c < 3; ++c) v |= static_cast<uint32_t>((a[c] + a[c + 4] + b[c] + b[c + 4] + 2) >> 2) << (8 * c);
+    out[i] = v;
   }
 }
 
@@ -207,6 +266,11 @@ void reduce(Job& job, int j0, int j1) {
   const int lanes = 4 * w;
   for (int j = j0; j < j1; ++j) {
     const int y0 = j * k, y1 = y0 + k < job.h ? y0 + k : job.h;
+    const bool pairs = k == 2 && y1 - y0 == 2 && !px_scalar_only();
+    if (pairs) {
+      reduce_pairs(job, j);
+      if (w % 2 == 0) continue;  // otherwise the last block below
+    }
     std::memset(sums, 0, static_cast<size_t>(lanes) * 2);
     for (int y = y0; y < y1; ++y) {
       const auto* row = reinterpret_cast<const uint8_t*>(job.src + static_cast<size_t>(y) * w);
@@ -228,7 +292,7 @@ void reduce(Job& job, int j0, int j1) {
       full_shift = 0;
       while ((1u << full_shift) < full) ++full_shift;
     }
-    for (int i = 0; i < job.rw; ++i) {
+    for (int i = pairs ? w / 2 : 0; i < job.rw; ++i) {
       const int x0 = i * k, x1 = x0 + k < w ? x0 + k : w;
       const uint32_t count = static_cast<uint32_t>((x1 - x0) * (y1 - y0));
       const uint32_t rec = count == full ? full_rec : (count > 1 ? reciprocal_of(count) : 0);
@@ -356,7 +420,7 @@ int IEL_VariableBlur_ARGB8888(structIELImage* input, structIELImage* output, int
   if (radius > kMaxRadius) radius = kMaxRadius;
   Job job{src, src, dst, w, h, radius, 1, w, h, nullptr, nullptr, {}, nullptr, 0};
   if (radius > kDirectRadius) {
-    job.q = radius <= kSmallReduced ? kReducedRadius - 1 : kReducedRadius;
+    job.q = radius <= kSmallReduced ? (radius == kDirectRadius + 1 ? 1 : kReducedRadius - 1) : kReducedRadius;
     job.k = (2 * radius + 4) / 9 > 2 ? (2 * radius + 4) / 9 : 2;
     job.rw = (w + job.k - 1) / job.k;
     job.rh = (h + job.k - 1) / job.k;

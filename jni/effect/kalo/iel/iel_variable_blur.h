@@ -4,7 +4,7 @@
 #include "iel.h"
 
 // Blurs the RGB of ARGB pixels with a Gaussian-looking kernel of sigma roughly
-// radius / 3 reaching `radius` pixels on each side up to radius 4 and at
+// radius / 3 reaching `radius` pixels on each side up to radius 3 and at
 // most radius + 2 beyond (0 or less: a copy; above 300 as 300); alpha kept;
 // output may be the input. 0, or 1/3/4 from the image checks. A failed working allocation
 // logs "Failed to allocate \n" and also returns 0 (output not written).
