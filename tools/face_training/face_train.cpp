@@ -703,8 +703,11 @@ int main(int argc, char** argv) {
     if (part == 0 && !doEye) continue;
     if (part == 1 && !doMouth) continue;
     const bool eye = part == 0;
+    // The mouth draws its own random sequence, so that eye settings do not
+    // change the mouth table.
+    if (!eye) rng.seed(static_cast<unsigned>(env_num("FACE_SEED", 20240611)) + 1);
     Spec sp = eye ? Spec{"eye", 15, 15, {}, {}, {22, 36, 100}, {7270, 10956, 17510}, INT_MAX,
-                         env_list("EYE_KEEP", {0.995, 0.99, 0.98}), env_num("EYE_EPS", 10), 1,
+                         env_list("EYE_KEEP", {0.995, 0.98, 0.93}), env_num("EYE_EPS", 10), 1,
                          env_num("EYE_SCALE", 6000)}
                   : Spec{"mouth", 15, 9, {}, {}, {10, 20, 30}, {5836, 8499, 12390}, INT_MAX,
                          env_list("MOUTH_KEEP", {0.995, 0.99, 0.97}), env_num("MOUTH_EPS", 10), 1,
@@ -722,7 +725,7 @@ int main(int argc, char** argv) {
     const std::vector<double> tolv = eye ? env_list("EYE_TOL", {3, 3, 3}) : env_list("MOUTH_TOL", {2, 1, 1});
     // Faces whose regions give negatives (every Nth), and the negatives mined per stage.
     const size_t negEvery = static_cast<size_t>(std::max(1.0, eye ? env_num("EYE_NEG_EVERY", 1) : env_num("MOUTH_NEG_EVERY", 2)));
-    const size_t negCount = static_cast<size_t>(eye ? env_num("EYE_NEGS", 100000) : env_num("MOUTH_NEGS", 40000));
+    const size_t negCount = static_cast<size_t>(eye ? env_num("EYE_NEGS", 300000) : env_num("MOUTH_NEGS", 40000));
     const int copies = static_cast<int>(std::max(1.0, env_num(eye ? "EYE_COPIES" : "MOUTH_COPIES", 1)));
     for (size_t i = 0; i < faces.size(); ++i) {
       if (greys[i].empty()) continue;
