@@ -22,7 +22,8 @@ COLOUR_BENCH(Hue, px_control_hue(p.in.data(), p.mask.data(), p.out.data(), p.wid
 COLOUR_BENCH(Hue100, px_control_hue_range100(p.in.data(), p.mask.data(), p.out.data(), p.width, p.height, 70, kWhole))
 // Masked: every pixel selected inside a full-picture rectangle.
 COLOUR_BENCH(Hue100Masked, {
-  static std::vector<unsigned char> all(p.in.size(), 1);
+  static std::vector<unsigned char> all;  // filled once per picture size, by the first run
+  if (all.size() < p.in.size()) all.assign(p.in.size(), 1);
   px_control_hue_range100(p.in.data(), all.data(), p.out.data(), p.width, p.height, 70,
                           px_rect{0, p.width - 1, 0, p.height - 1});
 })
