@@ -7,6 +7,9 @@
 #include "bench_jni.h"
 #include "bench_picture.h"
 
+#include "effect/kalo/iel/iel.h"
+#include "pixel_buffers.h"
+
 #define JNI_FN(name) Java_com_tav_android_pixara_photoretouching_jni_Engine_##name
 extern "C" {
 // Effects converted to packed RGB and back (with and without mask).
@@ -60,6 +63,47 @@ void through_jni(benchmark::State& state, Op op) {
 
 #define PIC c.jni.env(), nullptr, c.in, c.out, c.p.width, c.p.height
 #define REGION(level, rect) c.jni.env(), nullptr, c.in, c.mask, c.out, c.p.width, c.p.height, level, c.rect
+
+// The family A effects alone on the packed RGB of the same picture (made once,
+// outside the timing), so that each Engine figure minus its effect's is what
+// the bridge adds: the effects' times depend on the picture's content.
+void effect_alone(benchmark::State& state, int16_t effect, int32_t level, bool in_place) {
+  BenchPicture& p = bench_picture(static_cast<int>(state.range(0)));
+  const size_t n = p.in.size();
+  std::vector<unsigned char> rgb(n * 3), result(n * 3);
+  convertIntArrayToByteArray(p.in.data(), rgb.data(), p.width, p.height);
+  structIELImage src{p.width, p.height, IEL_FORMAT_RGB888, rgb.data()};
+  structIELImage dst{p.width, p.height, IEL_FORMAT_RGB888, in_place ? rgb.data() : result.data()};
+  structIELEffectParams params{effect, &level, nullptr, 0, 0};
+  bench_run(state, [&](BenchPicture&) {
+    if (IEL_Apply_Effect(&src, &dst, &params) != IEL_OK) state.SkipWithError("effect failed");
+  });
+}
+BENCHMARK_CAPTURE(effect_alone, sepia, IEL_EFFECT_SEPIA, 15, true)
+    ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK_CAPTURE(effect_alone, posterize, IEL_EFFECT_POSTERIZE, 0, true)
+    ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK_CAPTURE(effect_alone, cartoon, IEL_EFFECT_CARTOON, 2, false)
+    ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK_CAPTURE(effect_alone, magic_pen, IEL_EFFECT_MAGIC_PEN, 0, false)
+    ->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+// The bridge's two conversions on their own, into buffers already touched.
+void convert_to_rgb(benchmark::State& state) {
+  BenchPicture& p = bench_picture(static_cast<int>(state.range(0)));
+  std::vector<unsigned char> rgb(p.in.size() * 3);
+  bench_run(state, [&](BenchPicture& q) { convertIntArrayToByteArray(q.in.data(), rgb.data(), q.width, q.height); });
+}
+void convert_from_rgb(benchmark::State& state) {
+  BenchPicture& p = bench_picture(static_cast<int>(state.range(0)));
+  std::vector<unsigned char> rgb(p.in.size() * 3);
+  convertIntArrayToByteArray(p.in.data(), rgb.data(), p.width, p.height);
+  bench_run(state, [&](BenchPicture& q) {
+    convertByteArraytoIntArray(rgb.data(), q.out.data(), q.in.data(), q.width, q.height);
+  });
+}
+BENCHMARK(convert_to_rgb)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK(convert_from_rgb)->Arg(1)->Arg(12)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 BRIDGE_BENCH(applySepia, JNI_FN(applySepia)(PIC));
 BRIDGE_BENCH(applySepiaPartial,

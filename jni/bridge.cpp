@@ -144,8 +144,8 @@ struct RgbBuffers {
   unsigned char* dst = nullptr;
   unsigned char* result = nullptr;  // dst, or src for an effect run in place
   ~RgbBuffers() {
-    px_free(src);
-    px_free(dst);
+    px_free_large(src);
+    px_free_large(dst);
   }
 };
 
@@ -154,8 +154,8 @@ jint run_rgb_effect(Call& call, const jint* in, jint* texture, RgbBuffers& buf, 
   // Not zero-filled: the conversion writes every byte of src and the effect
   // every byte of dst.
   const bool in_place = request.in_place && !px_scalar_only();
-  buf.src = static_cast<unsigned char*>(px_malloc(bytes, 1));
-  if (!in_place) buf.dst = static_cast<unsigned char*>(px_malloc(bytes, 1));
+  buf.src = static_cast<unsigned char*>(px_malloc_large(bytes));
+  if (!in_place) buf.dst = static_cast<unsigned char*>(px_malloc_large(bytes));
   if (!buf.src || (!in_place && !buf.dst)) return PX_ERR_ALLOC;
   buf.result = in_place ? buf.src : buf.dst;
   convertIntArrayToByteArray(in, buf.src, call.width(), call.height());

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <cstring>
 
 #include "effect/kalo/if_utils_and.h"
@@ -19,6 +20,40 @@ TEST(Platform, CheckedAllocationRefusesEmptySizes) {
   if_free(nullptr, __FILE__, __LINE__);  // harmless
   void* z = px_malloc(0, 4);             // forwarded as malloc(0)
   px_free(z);
+}
+
+// Picture-sized blocks below and above the size that gets its own mapping:
+// every byte usable, freed blocks no longer counted, the failure hook obeyed.
+TEST(Platform, LargeBlocksAreWholeCountedAndCanFail) {
+  const long live = px_mem_live_blocks();
+  for (size_t bytes : {size_t{1}, size_t{12345}, (size_t{4} << 20) - 1, size_t{4} << 20, (size_t{9} << 20) + 7}) {
+    auto* a = static_cast<unsigned char*>(px_malloc_large(bytes));
+    auto* b = static_cast<unsigned char*>(px_malloc_large(bytes));
+    ASSERT_NE(a, nullptr) << bytes;
+    ASSERT_NE(b, nullptr) << bytes;
+    EXPECT_EQ(reinterpret_cast<uintptr_t>(a) % 16, 0u) << bytes;
+    EXPECT_EQ(px_mem_live_blocks(), live + 2);
+    // Two blocks that do not overlap, each written end to end.
+    std::memset(a, 0x3C, bytes);
+    std::memset(b, 0xC3, bytes);
+    EXPECT_EQ(a[0], 0x3C);
+    EXPECT_EQ(a[bytes - 1], 0x3C) << bytes;
+    EXPECT_EQ(b[bytes / 2], 0xC3) << bytes;
+    px_free_large(a);
+    px_free_large(b);
+    EXPECT_EQ(px_mem_live_blocks(), live);
+  }
+  const long failures = px_mem_failures();
+  px_mem_fail_nth(2);
+  void* first = px_malloc_large(size_t{5} << 20);
+  void* second = px_malloc_large(size_t{5} << 20);
+  EXPECT_NE(first, nullptr);
+  EXPECT_EQ(second, nullptr);
+  EXPECT_FALSE(px_mem_fail_pending());
+  EXPECT_EQ(px_mem_failures(), failures + 1);
+  px_free_large(first);
+  px_free_large(second);  // null: nothing to do
+  EXPECT_EQ(px_mem_live_blocks(), live);
 }
 
 TEST(Platform, MemsetIgnoresNullAndNonPositiveCounts) {

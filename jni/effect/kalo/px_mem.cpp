@@ -1,8 +1,13 @@
 #include "px_mem.h"
 
 #include <atomic>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
+
+#if defined(__linux__)
+#include <sys/mman.h>
+#endif
 
 namespace {
 std::atomic<long> g_fail_countdown{0};
@@ -57,3 +62,70 @@ void px_free(void* p) {
 
 void* px_memset(void* d, int value, size_t n) { return std::memset(d, value, n); }
 void* px_memcpy(void* d, const void* s, size_t n) { return std::memcpy(d, s, n); }
+
+// ---- large blocks ----------------------------------------------------------
+
+namespace {
+// Kept just before the block: where the memory came from, for px_free_large.
+struct alignas(16) LargeHeader {
+  void* base;     // the mapping or the malloc block
+  size_t length;  // of the mapping; 0 for a malloc block
+};
+
+constexpr size_t kLargePage = size_t{2} << 20;
+constexpr size_t kMapFrom = size_t{4} << 20;
+
+void* large_from_malloc(size_t bytes) {
+  auto* base = static_cast<unsigned char*>(std::malloc(bytes + sizeof(LargeHeader)));
+  if (!base) return nullptr;
+  auto* header = reinterpret_cast<LargeHeader*>(base);
+  *header = {base, 0};
+  return header + 1;
+}
+
+void* large_from_mapping(size_t bytes) {
+#if defined(__linux__) && defined(MAP_ANONYMOUS)
+  // Room for the header, for starting it on a large-page boundary and for
+  // ending on one; the slack is never touched, so it costs address space only.
+  const size_t used = bytes + sizeof(LargeHeader) + kLargePage - 1;
+  if (used < bytes) return nullptr;
+  const size_t length = (used & ~(kLargePage - 1)) + kLargePage;
+  if (length < used) return nullptr;
+  void* base = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+  if (base == MAP_FAILED) return nullptr;
+  const uintptr_t start = reinterpret_cast<uintptr_t>(base);
+  const uintptr_t aligned = (start + kLargePage - 1) & ~static_cast<uintptr_t>(kLargePage - 1);
+#if defined(MADV_HUGEPAGE)
+  // Only a hint: kernels without large pages refuse it and nothing changes.
+  madvise(reinterpret_cast<void*>(aligned), start + length - aligned, MADV_HUGEPAGE);
+#endif
+  auto* header = reinterpret_cast<LargeHeader*>(aligned);
+  *header = {base, length};
+  return header + 1;
+#else
+  (void)bytes;
+  return nullptr;
+#endif
+}
+}  // namespace
+
+void* px_malloc_large(size_t bytes) {
+  if (px_mem_take_failure()) return nullptr;
+  void* p = bytes >= kMapFrom ? large_from_mapping(bytes) : nullptr;
+  if (!p) p = large_from_malloc(bytes);
+  px_mem_count(p, 1);
+  return p;
+}
+
+void px_free_large(void* p) {
+  if (!p) return;
+  px_mem_count(p, -1);
+  const LargeHeader header = static_cast<LargeHeader*>(p)[-1];
+#if defined(__linux__) && defined(MAP_ANONYMOUS)
+  if (header.length) {
+    munmap(header.base, header.length);
+    return;
+  }
+#endif
+  std::free(header.base);
+}
