@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <cstdint>
 #include <cstring>
 
@@ -31,7 +32,7 @@ TEST(Platform, LargeBlocksAreWholeCountedAndCanFail) {
     auto* b = static_cast<unsigned char*>(px_malloc_large(bytes));
     ASSERT_NE(a, nullptr) << bytes;
     ASSERT_NE(b, nullptr) << bytes;
-    EXPECT_EQ(reinterpret_cast<uintptr_t>(a) % 16, 0u) << bytes;
+    EXPECT_EQ(reinterpret_cast<uintptr_t>(a) % alignof(std::max_align_t), 0u) << bytes;
     EXPECT_EQ(px_mem_live_blocks(), live + 2);
     // Two blocks that do not overlap, each written end to end.
     std::memset(a, 0x3C, bytes);

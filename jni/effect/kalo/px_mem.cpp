@@ -1,6 +1,7 @@
 #include "px_mem.h"
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
@@ -67,7 +68,7 @@ void* px_memcpy(void* d, const void* s, size_t n) { return std::memcpy(d, s, n);
 
 namespace {
 // Kept just before the block: where the memory came from, for px_free_large.
-struct alignas(16) LargeHeader {
+struct alignas(alignof(std::max_align_t)) LargeHeader {
   void* base;     // the mapping or the malloc block
   size_t length;  // of the mapping; 0 for a malloc block
 };

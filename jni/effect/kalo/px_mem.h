@@ -18,7 +18,8 @@ void* px_memset(void* d, int value, size_t n);
 // kernel may back it with large pages where it offers them (a fresh 36 MB
 // buffer otherwise costs some 9000 page faults, several times the time of
 // writing it); smaller ones come from malloc. Free only with px_free_large.
-// The failure hook and the block count treat them as px_malloc's.
+// Aligned as malloc's blocks. The failure hook and the block count treat
+// them as px_malloc's.
 void* px_malloc_large(size_t bytes);
 void px_free_large(void* p);
 void* px_memcpy(void* d, const void* s, size_t n);
