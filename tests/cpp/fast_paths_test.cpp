@@ -176,6 +176,22 @@ TEST(EffectsFast, PosterizeMatchesThePlainLoopInEveryFormat) {
   }
 }
 
+// The bridge runs posterize in place on packed RGB; every byte value, in rows
+// longer and shorter than the in-place runs of bytes.
+TEST(EffectsFast, PosterizeInPlaceMatchesThePlainLoopForEveryByte) {
+  for (const auto& pair_ : {std::pair{1, 1}, {86, 1}, {1, 256}, {129, 3}, {301, 5}}) {
+    const auto w = pair_.first;
+    const auto h = pair_.second;
+    std::vector<unsigned char> src(static_cast<size_t>(w) * h * 3);
+    for (size_t i = 0; i < src.size(); ++i) src[i] = static_cast<unsigned char>(i * 7 + i / 256);
+    const auto [fast, plain] = both_paths(src, [&](std::vector<unsigned char>& o) {
+      structIELImage a{w, h, IEL_FORMAT_RGB888, o.data()};
+      ASSERT_EQ(IEL_PosterizeNew(&a, &a), IEL_OK);
+    });
+    EXPECT_EQ(fast, plain) << w << "x" << h;
+  }
+}
+
 TEST(EffectsFast, VintageCurvesMatchThePlainLoop) {
   for (const auto& pair_ : kSizes) {
     const auto w = pair_.first;
