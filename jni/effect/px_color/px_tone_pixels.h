@@ -9,6 +9,15 @@
 #include "px_fixed.h"
 #include "px_region.h"
 
+// Before a pixel loop of the fused forms whose 16-bit products clang's cost
+// model turns down on x86 (it prices them as 32-bit multiplies) although the
+// vectorised loop is about twice as fast; no result changes.
+#if defined(__clang__)
+#define PX_VECTORISE _Pragma("clang loop vectorize(enable)")
+#else
+#define PX_VECTORISE
+#endif
+
 namespace px_tone {
 struct Rgb {
   int r, g, b;

@@ -99,6 +99,7 @@ bool dawncast_fused(const int* in, int* out, const int* overlay, const int* scre
       uint32_t* d = dst + i;
       for (size_t j = 0; j < n; ++j) run[j] = bright(s[j]);
       for (size_t j = 0; j < n; ++j) run[j] = tones(run[j]);
+      PX_VECTORISE
       for (size_t j = 0; j < n; ++j) d[j] = overlay_pixel16(screen_pixel16(sat(run[j]), scr[j]), ovl[j]);
     }
   });
