@@ -266,6 +266,32 @@ TEST(FilterChainsFast, FusedChainsMatchTheStepByStepChains) {
   }
 }
 
+// Gothic noir's fast path multiplies by the inverse span in its luma and
+// redness smoothsteps; the same values as the division for every colour's
+// luma and every difference of two channel values.
+TEST(FilterChainsFast, GothicNoirSmoothstepsByInverseMatchTheDivisionEverywhere) {
+  long luma_differs = 0, red_differs = 0;
+  for (int r = 0; r < 256; ++r) {
+    const double cr = r / 255.0;
+    for (int g = 0; g < 256; ++g) {
+      const double cg = g / 255.0;
+      const double x = cr - cg;
+      if (smoothstep(0.25, 0.45, x) != smoothstep_by_inverse(0.25, kNoirRednessInverse, x)) {
+        ADD_FAILURE() << "redness of " << r << " - " << g;
+        ++red_differs;
+      }
+      for (int b = 0; b < 256; ++b) {
+        const double l = 0.299 * cr + 0.587 * cg + 0.114 * (b / 255.0);
+        if (smoothstep(0.12, 0.78, l) != smoothstep_by_inverse(0.12, kNoirLumaInverse, l) && ++luma_differs < 5) {
+          ADD_FAILURE() << "luma of " << r << ", " << g << ", " << b;
+        }
+      }
+    }
+  }
+  EXPECT_EQ(luma_differs, 0);
+  EXPECT_EQ(red_differs, 0);
+}
+
 // The fused dawn cast's overlay sums two 16-bit products by halving them
 // first: the same shifted sum for every pair of products that can occur.
 TEST(FilterChainsFast, HalvedSumOfTwoProductsShiftsAsTheSum) {

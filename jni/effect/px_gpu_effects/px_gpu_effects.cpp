@@ -162,7 +162,10 @@ double row_distance(int y, int height) { return height > 1 ? 2.0 * y / (height -
 // each column's distance from a table, the redness only where step(0.35, r)
 // lets it count (elsewhere rd = 0 and the mix gives the grey exactly), and
 // no frame where length^2 <= 0.25 (there the smoothstep is 0 and the frame
-// exactly 1). `dx2` becomes the column distances.
+// exactly 1), and the luma and redness smoothsteps multiply by the inverse
+// of their span (the same floats for every colour; the frame's keeps its
+// division, as its inputs depend on the picture's size). `dx2` becomes the
+// column distances.
 // smoothstep and the channel write of the helpers above, in forms the
 // compiler inlines into the pixel loop (the same operations).
 inline double smoothstep_inline(double e0, double e1, double x) {
@@ -214,9 +217,9 @@ void gothicnoir_fast(const int* in, int* out, int width, int height, double* dx2
         }
         for (int j = 0; j < n; ++j) {
           const double r = cr[j], g = cg[j], b = cb[j];
-          const double v = smoothstep_inline(0.12, 0.78, luma({r, g, b}));
+          const double v = smoothstep_by_inverse(0.12, kNoirLumaInverse, luma({r, g, b}));
           const Col o{0.92 * v, 0.95 * v, v};
-          const double rd = smoothstep_inline(0.25, 0.45, r - (g > b ? g : b));
+          const double rd = smoothstep_by_inverse(0.25, kNoirRednessInverse, r - (g > b ? g : b));
           const Col m = mix(o, {0.15 + 0.75 * r, 0.02, 0.06}, rd);
           const bool red = r >= 0.35;
           const Col t{red ? m.r : o.r, red ? m.g : o.g, red ? m.b : o.b};

@@ -24,6 +24,20 @@ double step(double edge, double x);
 double length(double x, double y);
 double flength(float x, float y);
 
+// smoothstep with the division by e1 - e0 replaced by a multiplication by
+// `inverse` = 1 / (e1 - e0), for fast paths: the same value only where a test
+// checks it for every x the operation can meet. Gothic noir's luma and
+// redness smoothsteps take it (checked for every colour and every pair of
+// channel values).
+inline double smoothstep_by_inverse(double e0, double inverse, double x) {
+  const float a = static_cast<float>((x - e0) * inverse);
+  const float m = a > 0.0f ? a : 0.0f;
+  const double t = m < 1.0f ? m : 1.0f;
+  return t * t * (3.0 - 2.0 * t);
+}
+inline constexpr double kNoirLumaInverse = 1.0 / (0.78 - 0.12);
+inline constexpr double kNoirRednessInverse = 1.0 / (0.45 - 0.25);
+
 // ---- members ---------------------------------------------------------------
 
 void gpu_Turquoise(int* in, int* out, int width, int height);
