@@ -286,7 +286,6 @@ bool vintage_in_runs(const int* in, int* out, int width, int height, const Vinta
         for (int j = 0; j < n; ++j) run[j] = m.before(s[x0 + j]);
         for (int j = 0; j < n; ++j) run[j] = Brightness16{20}(run[j]);
         for (int j = 0; j < n; ++j) run[j] = m.after(run[j]);
-        PX_VECTORISE
         for (int j = 0; j < n; ++j) {
           const uint32_t f = static_cast<uint32_t>((fy - cols[x0 + j]) >> 8);
           d[x0 + j] = sat(Vignette::apply(run[j], f));
