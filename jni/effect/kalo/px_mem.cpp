@@ -76,6 +76,20 @@ struct alignas(alignof(std::max_align_t)) LargeHeader {
 constexpr size_t kLargePage = size_t{2} << 20;
 constexpr size_t kMapFrom = size_t{4} << 20;
 
+// Under AddressSanitizer every block comes from malloc, so that writes past
+// its end are still reported (a mapping has no guard zones around it).
+#if defined(__SANITIZE_ADDRESS__)
+constexpr bool kMapLarge = false;
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+constexpr bool kMapLarge = false;
+#else
+constexpr bool kMapLarge = true;
+#endif
+#else
+constexpr bool kMapLarge = true;
+#endif
+
 void* large_from_malloc(size_t bytes) {
   auto* base = static_cast<unsigned char*>(std::malloc(bytes + sizeof(LargeHeader)));
   if (!base) return nullptr;
@@ -112,7 +126,7 @@ void* large_from_mapping(size_t bytes) {
 
 void* px_malloc_large(size_t bytes) {
   if (px_mem_take_failure()) return nullptr;
-  void* p = bytes >= kMapFrom ? large_from_mapping(bytes) : nullptr;
+  void* p = kMapLarge && bytes >= kMapFrom ? large_from_mapping(bytes) : nullptr;
   if (!p) p = large_from_malloc(bytes);
   px_mem_count(p, 1);
   return p;
