@@ -397,11 +397,20 @@ int IEL_MagicPenNew_RGB(structIELImage* input, structIELImage* output) {
       const unsigned char* b = src + y * row;
       const unsigned char* c = src + (y + 1) * row;
       unsigned char* o = dst + y * row;
-      for (int i = 3; i < static_cast<int>(row) - 3; ++i) {
-        const int gx = (a[i + 3] - a[i - 3]) + 2 * (b[i + 3] - b[i - 3]) + (c[i + 3] - c[i - 3]);
-        const int gy = (c[i - 3] + 2 * c[i] + c[i + 3]) - (a[i - 3] + 2 * a[i] + a[i + 3]);
+      // Each tap its own pointer and the bound a local, so the index is the
+      // only thing that moves: with wrapping signed arithmetic an offset
+      // added to the index would hide that the reads are contiguous, and the
+      // loop would not vectorise.
+      const unsigned char *al = a, *am = a + 3, *ar = a + 6;
+      const unsigned char *bl = b, *br = b + 6;
+      const unsigned char *cl = c, *cm = c + 3, *cr = c + 6;
+      unsigned char* out = o + 3;
+      const int n = static_cast<int>(row) - 6;
+      for (int k = 0; k < n; ++k) {
+        const int gx = (ar[k] - al[k]) + 2 * (br[k] - bl[k]) + (cr[k] - cl[k]);
+        const int gy = (cl[k] + 2 * cm[k] + cr[k]) - (al[k] + 2 * am[k] + ar[k]);
         const double g = std::sqrt(static_cast<double>(gx * gx + gy * gy));
-        o[i] = g >= 255.0 ? 255 : static_cast<unsigned char>(g);
+        out[k] = g >= 255.0 ? 255 : static_cast<unsigned char>(g);
       }
       std::memcpy(o, o + 3, 3);
       std::memcpy(o + row - 3, o + row - 6, 3);
