@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <cstring>
 #include <functional>
 #include <random>
 #include <vector>
@@ -151,6 +152,15 @@ TEST(NeighbourhoodPaths, OilPaintLevelPlaneMatchesThePlainModeFilter) {
       const Both m = both_paths([&] { return run_rgb(in, s.w, s.h, IEL_OilifyFix); });
       ASSERT_EQ(m.fast, m.plain) << s.w << "x" << s.h;
     }
+    // Three colours of three levels (one of them darkened where its blurred
+    // red is higher): windows full of tied counts, where the visit order
+    // decides the pick.
+    const unsigned char palette[3][3] = {{250, 30, 30}, {40, 40, 200}, {90, 250, 90}};
+    Bytes few(static_cast<size_t>(s.w) * s.h * 3);
+    std::mt19937 gen(seed++);
+    for (size_t i = 0; i < few.size(); i += 3) std::memcpy(&few[i], palette[gen() % 3], 3);
+    const Both r = both_paths([&] { return run_rgb(few, s.w, s.h, IEL_OilPaintEdge); });
+    ASSERT_EQ(r.fast, r.plain) << s.w << "x" << s.h << " three colours";
   }
 }
 
