@@ -1,4 +1,6 @@
 // Mirror, twirl and sphericity.
+#include <array>
+#include <cmath>
 #include <cstdint>
 #include <cstring>
 
@@ -82,17 +84,38 @@ struct Sample {
   int x, xi, yi, fx, fy;
 };
 
-// Runs map(x, y, &sample) over the visited positions of the rectangle, row
-// groups on worker threads; map says whether (x, y) is moved and from where.
-// The samples of up to kChunk visited pixels of a row are worked out first
-// (their source rows fetched ahead), then read and written: the reads of
-// scattered source rows overlap instead of waiting one by one. Each visited
-// row writes only its own row (and, in half resolution, the row below it,
-// which is never visited), so the result does not depend on the split.
+// A row's mapper: map(x, sample) says whether (x, y) is moved and from
+// where; it moves nothing left of x_lo or right of x_hi.
+template <class F>
+struct RowMap {
+  long long x_lo, x_hi;
+  F map;
+};
+template <class F>
+RowMap<F> row_map(long long x_lo, long long x_hi, F map) {
+  return {x_lo, x_hi, map};
+}
+constexpr long long kNoBound = 1LL << 40;
+
+// Largest e >= 0 with e * e <= n (n >= 0).
+long long floor_sqrt(long long n) {
+  long long e = static_cast<long long>(std::sqrt(static_cast<double>(n)));
+  while (e > 0 && e * e > n) --e;
+  while ((e + 1) * (e + 1) <= n) ++e;
+  return e;
+}
+
+// Runs the mapper make_row(y) returns over the visited positions of each
+// visited row of the rectangle, row groups on worker threads. The samples of
+// up to kChunk visited pixels of a row are worked out first (their source
+// rows fetched ahead), then read and written: the reads of scattered source
+// rows overlap instead of waiting one by one. Each visited row writes only
+// its own row (and, in half resolution, the row below it, which is never
+// visited), so the result does not depend on the split.
 constexpr int kChunk = 128;
-template <class Map>
-void visit_sampled(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom,
-                   bool half, Map map) {
+template <class MakeRow>
+void visit_rows(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom, bool half,
+                MakeRow make_row) {
   const int step = half ? 2 : 1;
   const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
   if (rows.count == 0 || cols.count == 0) return;
@@ -102,12 +125,20 @@ void visit_sampled(const int* src, int* dst, int width, int height, int left, in
         Sample buf[kChunk];
         for (int r = r0; r < r1; ++r) {
           const int y = rows.first + r * step;
-          for (int c0 = 0; c0 < cols.count; c0 += kChunk) {
-            const int c1 = c0 + kChunk < cols.count ? c0 + kChunk : cols.count;
+          auto row = make_row(y);
+          // The visited columns within the mapper's bounds.
+          const long long last = cols.first + static_cast<long long>(cols.count - 1) * step;
+          const long long lo = row.x_lo > cols.first ? row.x_lo : cols.first;
+          const long long hi = row.x_hi < last ? row.x_hi : last;
+          if (lo > hi) continue;
+          const int c_begin = static_cast<int>((lo - cols.first + step - 1) / step);
+          const int c_end = static_cast<int>((hi - cols.first) / step + 1);
+          for (int c0 = c_begin; c0 < c_end; c0 += kChunk) {
+            const int c1 = c0 + kChunk < c_end ? c0 + kChunk : c_end;
             int n = 0;
             for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
               Sample& sm = buf[n];
-              if (!map(x, y, sm)) continue;
+              if (!row.map(x, sm)) continue;
               sm.x = x;
               const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
               __builtin_prefetch(src + at(px, py, width));
@@ -122,6 +153,21 @@ void visit_sampled(const int* src, int* dst, int width, int height, int left, in
         }
       },
       half ? 32 : 64);
+}
+
+// The columns of row y within the disc dx^2 + dy^2 <= limit around cx (none
+// when the row misses it). Unbounded where the plain path's 32-bit squares
+// could wrap (a side above 32768), so that it moves the same pixels, and on
+// the plain path, which tests every pixel.
+struct Columns {
+  long long lo, hi;
+};
+Columns disc_columns(int width, int height, int cx, int cy, int y, long long limit) {
+  if (width > 32768 || height > 32768 || px_scalar_only()) return {-kNoBound, kNoBound};
+  const long long dy = y - cy, room = limit - dy * dy;
+  if (room < 0) return {1, 0};
+  const long long e = floor_sqrt(room);
+  return {cx - e, cx + e};
 }
 
 // sqrt of t (0..2^30) with 2^30 -> 0x80000, through the step tables.
@@ -242,6 +288,7 @@ int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidt
 // ---- twirl and sphericity -------------------------------------------------------
 
 namespace {
+
 // FATAN2 with the quotient 0x20000000 / big supplied by `quotient(big)`.
 template <class Quotient>
 inline int fatan2_with(int x, int y, Quotient quotient) {
@@ -293,7 +340,10 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     quotients[0] = 0;  // never read: big is 0 only where the angle needs no quotient
     for (int d = 1; d < longer; ++d) quotients[d] = 0x20000000u / static_cast<uint32_t>(d);
   }
-  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
+  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
+    // Inside the circle: dx^2 + dy^2 <= r2 - 1.
+    const Columns in = disc_columns(width, height, centerX, centerY, y, static_cast<long long>(r2) - 1);
+    return row_map(in.lo, in.hi, [&, y](int x, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
     if (d2 >= r2) return false;
@@ -323,6 +373,7 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
     sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
     return true;
+    });
   });
   px_free(quotients);
   return PX_OK;
@@ -357,7 +408,23 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       steps[i] = {m, Dn, 0x40000000 / Dn, divisor_of(static_cast<uint32_t>(Dn))};
     }
   }
-  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
+  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
+    // On the fast path the row's source row and its weight for every step:
+    // they depend on the row and the step only.
+    struct Down {
+      int yi, fy;
+    };
+    std::array<Down, 257> down;
+    if (fast) {
+      for (int i = 0; i <= 256; ++i) {
+        const Step& st = steps[i];
+        const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + st.m * static_cast<uint32_t>(centerY));
+        const int yi = divide(Y, st.div);
+        down[i] = {yi, (st.inv * (Y - st.Dn * yi)) >> 19};
+      }
+    }
+    const Columns in = disc_columns(width, height, centerX, centerY, y, R2);
+    return row_map(in.lo, in.hi, [&, down, y](int x, Sample& sm) {
     const int dx = x - centerX, dy = y - centerY;
     const int d2 = dx * dx + dy * dy;
     if (d2 > R2) return false;
@@ -365,13 +432,13 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
     const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
     int xi, yi, fx, fy;
     if (fast) {
-      const Step& st = steps[(i >= 0 && i < 256) ? i : 256];
+      const int at_step = (i >= 0 && i < 256) ? i : 256;
+      const Step& st = steps[at_step];
       const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
-      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + st.m * static_cast<uint32_t>(centerY));
       xi = divide(X, st.div);
-      yi = divide(Y, st.div);
       fx = (st.inv * (X - st.Dn * xi)) >> 19;
-      fy = (st.inv * (Y - st.Dn * yi)) >> 19;
+      yi = down[at_step].yi;
+      fy = down[at_step].fy;
     } else if (strength >= 0) {
       const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
       const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
@@ -393,6 +460,7 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
     }
     sm = {x, xi, yi, fx, fy};
     return true;
+    });
   });
   return PX_OK;
 }
