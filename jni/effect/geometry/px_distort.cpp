@@ -1,5 +1,6 @@
 // Mirror, twirl and sphericity.
 #include <array>
+#include <atomic>
 #include <cmath>
 #include <cstdint>
 #include <cstring>
@@ -307,6 +308,118 @@ inline int fatan2_with(int x, int y, Quotient quotient) {
 }
 }  // namespace
 
+// The distance and the sine and cosine of the turned angle of a twirled pixel.
+struct TwirlAt {
+  int D, sn, cs;
+};
+
+namespace {
+// The twirl's fast path over pairs of pixels mirrored through the centre,
+// (x, y) and (2 cx - x, 2 cy - y): they have the same distance, and their
+// angles differ by exactly half a turn (the angle table is read with the
+// same quotient, and its quadrants mirror), so the turned angles differ by
+// half a turn, step k by 8192 of 16384, and the sine and cosine only change
+// sign. One pixel's twirl_at serves both; twirl_offset of the negated sine
+// and cosine places the mirror. A job is a visited row with its mirror row
+// when that is visited too (the row through the centre pairs its own
+// columns); the mirror row's columns whose mirror column is not visited are
+// worked out on their own. Each job writes only its rows (and in half
+// resolution the rows below them, never visited), so the result does not
+// depend on the split. False, with nothing written, when the job list
+// cannot be had.
+template <class At>
+bool twirl_in_pairs(const int* src, int* dst, int width, int height, int cx, int cy, int r2, int left, int right,
+                    int top, int bottom, bool half, At twirl_at) {
+  const int step = half ? 2 : 1;
+  const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
+  if (rows.count == 0 || cols.count == 0) return true;
+  const long long row_last = rows.first + static_cast<long long>(rows.count - 1) * step;
+  const long long col_last = cols.first + static_cast<long long>(cols.count - 1) * step;
+  // A mirror keeps the parity of its row and column, so within the bounds
+  // it is a visited position.
+  auto row_visited = [&](long long y) { return y >= rows.first && y <= row_last; };
+  auto col_visited = [&](long long x) { return x >= cols.first && x <= col_last; };
+  auto* jobs = static_cast<int*>(px_malloc(static_cast<size_t>(rows.count), sizeof(int)));
+  if (!jobs) return false;
+  int count = 0;
+  for (int r = 0; r < rows.count; ++r) {
+    const int y = rows.first + r * step;
+    const long long mirror = 2LL * cy - y;
+    if (!(row_visited(mirror) && mirror < y)) jobs[count++] = y;
+  }
+  struct Job {
+    int x, y, xi, yi, fx, fy;
+  };
+  constexpr int kBlock = 4;  // jobs taken at a time
+  std::atomic<int> next{0};
+  const int blocks = (count + kBlock - 1) / kBlock;
+  px_for_rows(
+      blocks,
+      [&](int, int) {
+        Job buf[2 * kChunk];
+        int n = 0;
+        auto add = [&](int x, int y, Axis ax, Axis ay) {
+          buf[n++] = {x, y, ax.whole, ay.whole, ax.weight, ay.weight};
+          const int px = clamp(ax.whole, 0, width - 1), py = clamp(ay.whole, 0, height - 1);
+          __builtin_prefetch(src + at(px, py, width));
+          __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
+        };
+        auto flush = [&] {
+          for (int i = 0; i < n; ++i) {
+            const Job& j = buf[i];
+            put(src, dst, width, height, j.x, j.y, sample(src, width, height, j.xi, j.yi, j.fx, j.fy), half);
+          }
+          n = 0;
+        };
+        // The visited columns of row y inside the circle, as c_begin..c_end.
+        auto columns = [&](int y, int* c_begin, int* c_end) {
+          const Columns in = disc_columns(width, height, cx, cy, y, static_cast<long long>(r2) - 1);
+          const long long lo = in.lo > cols.first ? in.lo : cols.first;
+          const long long hi = in.hi < col_last ? in.hi : col_last;
+          *c_begin = lo > hi ? 0 : static_cast<int>((lo - cols.first + step - 1) / step);
+          *c_end = lo > hi ? 0 : static_cast<int>((hi - cols.first) / step + 1);
+        };
+        for (int b = next.fetch_add(1); b < blocks; b = next.fetch_add(1)) {
+          for (int jb = b * kBlock; jb < count && jb < (b + 1) * kBlock; ++jb) {
+            const int y = jobs[jb];
+            const long long mirror_row = 2LL * cy - y;
+            const bool paired = row_visited(mirror_row);  // then mirror_row >= y
+            const int y2 = static_cast<int>(mirror_row);
+            int c_begin, c_end;
+            columns(y, &c_begin, &c_end);
+            for (int c = c_begin; c < c_end; ++c) {
+              const int x = cols.first + c * step;
+              const long long x2 = 2LL * cx - x;
+              const bool pair = paired && col_visited(x2) && !(y2 == y && x2 == x);
+              if (pair && y2 == y && x2 < x) continue;  // done with its mirror
+              TwirlAt a;
+              if (!twirl_at(x - cx, y - cy, &a)) continue;
+              add(x, y, twirl_offset(cx, a.D, a.sn), twirl_offset(cy, a.D, a.cs));
+              if (pair) add(static_cast<int>(x2), y2, twirl_offset(cx, a.D, -a.sn), twirl_offset(cy, a.D, -a.cs));
+              if (n >= 2 * kChunk - 1) flush();
+            }
+            if (paired && y2 != y) {
+              // The mirror row's columns whose mirror column is not visited.
+              columns(y2, &c_begin, &c_end);
+              for (int c = c_begin; c < c_end; ++c) {
+                const int x = cols.first + c * step;
+                if (col_visited(2LL * cx - x)) continue;
+                TwirlAt a;
+                if (!twirl_at(x - cx, y2 - cy, &a)) continue;
+                add(x, y2, twirl_offset(cx, a.D, a.sn), twirl_offset(cy, a.D, a.cs));
+                if (n >= 2 * kChunk - 1) flush();
+              }
+            }
+            flush();
+          }
+        }
+      },
+      1);
+  px_free(jobs);
+  return true;
+}
+}  // namespace
+
 int FATAN2(int x, int y) {
   return fatan2_with(x, y, [](uint32_t big) { return 0x20000000u / big; });
 }
@@ -340,11 +453,9 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     quotients[0] = 0;  // never read: big is 0 only where the angle needs no quotient
     for (int d = 1; d < longer; ++d) quotients[d] = 0x20000000u / static_cast<uint32_t>(d);
   }
-  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
-    // Inside the circle: dx^2 + dy^2 <= r2 - 1.
-    const Columns in = disc_columns(width, height, centerX, centerY, y, static_cast<long long>(r2) - 1);
-    return row_map(in.lo, in.hi, [&, y](int x, Sample& sm) {
-    const int dx = x - centerX, dy = y - centerY;
+  // The turned position of the pixel (dx, dy) from the centre: its distance
+  // D and the sine and cosine of its angle; false outside the circle.
+  auto twirl_at = [&](int dx, int dy, TwirlAt* at) {
     const int d2 = dx * dx + dy * dy;
     if (d2 >= r2) return false;
     const int t = d2 * per;
@@ -370,9 +481,23 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
       cs = SIN[k - 12288];
       sn = -SIN[16384 - k];
     }
-    const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
-    sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+    *at = {D, sn, cs};
     return true;
+  };
+  if (quotients && twirl_in_pairs(src, dst, width, height, centerX, centerY, r2, left, right, top, bottom, half != 0,
+                                  twirl_at)) {
+    px_free(quotients);
+    return PX_OK;
+  }
+  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
+    // Inside the circle: dx^2 + dy^2 <= r2 - 1.
+    const Columns in = disc_columns(width, height, centerX, centerY, y, static_cast<long long>(r2) - 1);
+    return row_map(in.lo, in.hi, [&, y](int x, Sample& sm) {
+      TwirlAt at;
+      if (!twirl_at(x - centerX, y - centerY, &at)) return false;
+      const Axis ax = twirl_offset(centerX, at.D, at.sn), ay = twirl_offset(centerY, at.D, at.cs);
+      sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+      return true;
     });
   });
   px_free(quotients);

@@ -192,6 +192,70 @@ const HalftoneTables& halftone_tables() {
   return tables;
 }
 
+// The largest dot radius any channel draws.
+constexpr int kMaxDotRadius = 5;
+
+// The rows y0..y1-1 of a filled dot, as IEL_Halftone_bresan_circle draws it
+// with its pixels outside the picture skipped.
+void dot_rows(unsigned char* screen, int w, int y0, int y1, int cx, int cy, int r) {
+  auto span = [&](int y, int xa, int xb) {
+    if (y < y0 || y >= y1) return;
+    xa = xa < 0 ? 0 : xa;
+    xb = xb > w - 1 ? w - 1 : xb;
+    if (xa <= xb) std::memset(screen + static_cast<size_t>(y) * w + xa, 255, static_cast<size_t>(xb - xa + 1));
+  };
+  int x = r, y = 0, err = 1 - r;
+  while (x >= y) {
+    span(cy + y, cx - x, cx + x);
+    span(cy - y, cx - x, cx + x);
+    span(cy + x, cx - y, cx + y);
+    span(cy - x, cx - y, cx + y);
+    ++y;
+    if (err < 0) {
+      err += 2 * y + 1;
+    } else {
+      --x;
+      err += 2 * (y - x) + 1;
+    }
+  }
+}
+
+// IEL_Halftone_HalftonePerChannel over row bands: a screen is the union of
+// its dots, so each band clears its own rows and draws the part of every dot
+// centred within kMaxDotRadius rows of them, with the same dot centres (the
+// same expressions) and radii.
+void screen_banded(const unsigned char* plane, unsigned char* screen, int width, int height, int cell, double slope,
+                   int channel) {
+  const double norm = std::sqrt(1 + slope * slope);
+  const double dx = 1 / norm, dy = slope / norm;
+  const double nx = -dy, ny = dx;
+  const int spacing = (channel == 1 ? 4 : 2) * cell;
+  const double side = width > height ? width : height;
+  double amin = 0, amax = 0, bmin = 0, bmax = 0;
+  const double corners[4][2] = {{0, 0}, {side, 0}, {0, side}, {side, side}};
+  for (const auto& c : corners) {
+    const double a = c[0] * dx + c[1] * dy, b = c[0] * nx + c[1] * ny;
+    amin = a < amin ? a : amin, amax = a > amax ? a : amax;
+    bmin = b < bmin ? b : bmin, bmax = b > bmax ? b : bmax;
+  }
+  const int j0 = static_cast<int>(std::floor(bmin / spacing)), j1 = static_cast<int>(std::ceil(bmax / spacing));
+  const int t0 = static_cast<int>(std::floor(amin / cell)), t1 = static_cast<int>(std::ceil(amax / cell));
+  px_for_rows(height, [&](int y0, int y1) {
+    std::memset(screen + static_cast<size_t>(y0) * width, 0, static_cast<size_t>(y1 - y0) * width);
+    for (int j = j0; j <= j1; ++j) {
+      const double ox = j * spacing * nx, oy = j * spacing * ny;
+      for (int t = t0; t <= t1; ++t) {
+        const int cx = static_cast<int>(std::floor(ox + t * cell * dx + 0.5));
+        const int cy = static_cast<int>(std::floor(oy + t * cell * dy + 0.5));
+        if (cx < 0 || cx >= width || cy < 0 || cy >= height) continue;
+        if (cy + kMaxDotRadius < y0 || cy - kMaxDotRadius >= y1) continue;
+        const int r = IEL_Halftone_AnalyseCircleRadius(plane, width, height, cx, cy, cell, channel);
+        if (r > 0) dot_rows(screen, width, y0, y1, cx, cy, r);
+      }
+    }
+  });
+}
+
 // The separation by the tables, rows on worker threads.
 void separate_fast(const unsigned char* rgb, int width, int height, unsigned char* c, unsigned char* m,
                    unsigned char* y, unsigned char* k) {
@@ -266,7 +330,8 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
   static const int kPlane[3] = {0, 2, 1};  // cyan, yellow, magenta
   for (int i = 0; i < 3; ++i) {
     const int p = kPlane[i];
-    IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    if (fast) screen_banded(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    else IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
     unsigned char* t = planes[p];
     planes[p] = planes[4];
     planes[4] = t;
