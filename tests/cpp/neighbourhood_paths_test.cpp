@@ -191,9 +191,15 @@ TEST(NeighbourhoodPaths, ShaderLooksReadByTablesAsThePlainPathDivides) {
         std::vector<int> out(n, 0x5A5A5A5A);
         const std::vector<int> before = in;
         switch (which) {
-          case 0: gpu_oilPastel(in.data(), out.data(), t1.data(), s.w, s.h); break;
-          case 1: gpu_impressionist(in.data(), out.data(), t1.data(), t2.data(), s.w, s.h); break;
-          default: gpu_stucchevole(in.data(), out.data(), t1.data(), t2.data(), t3.data(), s.w, s.h); break;
+          case 0:
+            gpu_oilPastel(in.data(), out.data(), t1.data(), s.w, s.h);
+            break;
+          case 1:
+            gpu_impressionist(in.data(), out.data(), t1.data(), t2.data(), s.w, s.h);
+            break;
+          default:
+            gpu_stucchevole(in.data(), out.data(), t1.data(), t2.data(), t3.data(), s.w, s.h);
+            break;
         }
         EXPECT_EQ(in, before);
         return as_bytes(out);

@@ -484,8 +484,9 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     *at = {D, sn, cs};
     return true;
   };
-  if (quotients && twirl_in_pairs(src, dst, width, height, centerX, centerY, r2, left, right, top, bottom, half != 0,
-                                  twirl_at)) {
+  // (In place, a pair's mirror would be read after being written.)
+  if (quotients && src != dst &&
+      twirl_in_pairs(src, dst, width, height, centerX, centerY, r2, left, right, top, bottom, half != 0, twirl_at)) {
     px_free(quotients);
     return PX_OK;
   }
@@ -504,8 +505,8 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
   return PX_OK;
 }
 
-int px_sphericity(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius,
-                  int strength, int left, int right, int top, int bottom, int half) {
+int px_sphericity(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius, int strength,
+                  int left, int right, int top, int bottom, int half) {
   if (!(centerX >= 0 && centerX < width && centerY >= 0 && centerY < height && radius > 0 && strength >= -100 &&
         strength <= 100)) {
     return PX_ERR_NULL;
@@ -550,41 +551,41 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
     }
     const Columns in = disc_columns(width, height, centerX, centerY, y, R2);
     return row_map(in.lo, in.hi, [&, down, y](int x, Sample& sm) {
-    const int dx = x - centerX, dy = y - centerY;
-    const int d2 = dx * dx + dy * dy;
-    if (d2 > R2) return false;
-    const int i = (per * d2) >> 22;
-    const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
-    int xi, yi, fx, fy;
-    if (fast) {
-      const int at_step = (i >= 0 && i < 256) ? i : 256;
-      const Step& st = steps[at_step];
-      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
-      xi = divide(X, st.div);
-      fx = (st.inv * (X - st.Dn * xi)) >> 19;
-      yi = down[at_step].yi;
-      fy = down[at_step].fy;
-    } else if (strength >= 0) {
-      const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
-      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
-      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));
-      const int Dn = static_cast<int>(m + 0x40000);
-      xi = X / Dn;
-      yi = Y / Dn;
-      const int inv = 0x40000000 / Dn;
-      fx = (inv * (X - Dn * xi)) >> 19;
-      fy = (inv * (Y - Dn * yi)) >> 19;
-    } else {
-      const int n = (static_cast<int>(L) * (-30 * strength)) >> 12;
-      const int X = static_cast<int>(static_cast<uint32_t>(x) << 18) + signed_product(dx, n);
-      const int Y = static_cast<int>(static_cast<uint32_t>(y) << 18) + signed_product(dy, n);
-      xi = X >> 18;
-      yi = Y >> 18;
-      fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
-      fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
-    }
-    sm = {x, xi, yi, fx, fy};
-    return true;
+      const int dx = x - centerX, dy = y - centerY;
+      const int d2 = dx * dx + dy * dy;
+      if (d2 > R2) return false;
+      const int i = (per * d2) >> 22;
+      const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
+      int xi, yi, fx, fy;
+      if (fast) {
+        const int at_step = (i >= 0 && i < 256) ? i : 256;
+        const Step& st = steps[at_step];
+        const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
+        xi = divide(X, st.div);
+        fx = (st.inv * (X - st.Dn * xi)) >> 19;
+        yi = down[at_step].yi;
+        fy = down[at_step].fy;
+      } else if (strength >= 0) {
+        const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
+        const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
+        const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));
+        const int Dn = static_cast<int>(m + 0x40000);
+        xi = X / Dn;
+        yi = Y / Dn;
+        const int inv = 0x40000000 / Dn;
+        fx = (inv * (X - Dn * xi)) >> 19;
+        fy = (inv * (Y - Dn * yi)) >> 19;
+      } else {
+        const int n = (static_cast<int>(L) * (-30 * strength)) >> 12;
+        const int X = static_cast<int>(static_cast<uint32_t>(x) << 18) + signed_product(dx, n);
+        const int Y = static_cast<int>(static_cast<uint32_t>(y) << 18) + signed_product(dy, n);
+        xi = X >> 18;
+        yi = Y >> 18;
+        fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
+        fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
+      }
+      sm = {x, xi, yi, fx, fy};
+      return true;
     });
   });
   return PX_OK;

@@ -885,8 +885,8 @@ int IEL_Sketch_Texture(structIELImage* input, structIELImage* output, structIELI
     IF_ERROR("Texture image structure in NULL \n");
     return IEL_ERR_NULL;
   }
-  const bool fits = texture->width == input->width && texture->height == input->height &&
-                    texture->format == IEL_FORMAT_ARGB_PACK;
+  const bool fits =
+      texture->width == input->width && texture->height == input->height && texture->format == IEL_FORMAT_ARGB_PACK;
   if (fits && !px_scalar_only()) {
     // The sketch's checks as it logs them, then its clamped darkness 3 and
     // blur level 2, blended as it goes.
