@@ -289,6 +289,18 @@ int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidt
 // ---- twirl and sphericity -------------------------------------------------------
 
 namespace {
+// The source copied to the output (the pixels a distortion leaves), on the
+// fast path in row bands on the workers; returns dst as memmove does.
+void* copy_picture(int* dst, const int* src, int width, int height) {
+  const size_t row = static_cast<size_t>(width), n = row * static_cast<size_t>(height);
+  const bool overlap = dst < src + n && src < dst + n;
+  if (px_scalar_only() || overlap) return std::memmove(dst, src, n * 4);
+  px_for_rows(height, [&](int y0, int y1) {
+    std::memcpy(dst + y0 * row, src + y0 * row, (y1 - y0) * row * 4);
+  });
+  return dst;
+}
+
 
 // FATAN2 with the quotient 0x20000000 / big supplied by `quotient(big)`.
 template <class Quotient>
@@ -436,7 +448,7 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
         angle <= 360)) {
     return PX_ERR_NULL;
   }
-  void* copied = std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  void* copied = copy_picture(dst, src, width, height);
   // Angle 0 answers with what the copy returned (the output's address, cut
   // to an int), not 0xA000; callers of old see it that way.
   if (angle == 0) return static_cast<int>(reinterpret_cast<intptr_t>(copied));
@@ -511,7 +523,7 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
         strength <= 100)) {
     return PX_ERR_NULL;
   }
-  std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  copy_picture(dst, src, width, height);
   if (bottom < top) return PX_OK;
   // The working radius is enlarged on purpose (about 1.4 times).
   const int R2 = (500 * radius * radius + 128) >> 8;
