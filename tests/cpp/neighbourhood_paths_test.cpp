@@ -164,6 +164,29 @@ TEST(NeighbourhoodPaths, OilPaintLevelPlaneMatchesThePlainModeFilter) {
   }
 }
 
+// The streamed effects keep rings of rows per band and start each band from
+// the rows above it: heights from one band to several, so that the band
+// edges fall at every offset of the rings (three, eight rows) and of the
+// dots of the halftone screens.
+TEST(NeighbourhoodPaths, StreamedBandsMatchThePlainPathAtManyHeights) {
+  const int w = 23;
+  for (int h = 30; h <= 140; h += 11) {
+    const Bytes in = smooth_rgb(w, h, static_cast<unsigned>(h));
+    std::vector<uint32_t> texture(static_cast<size_t>(w) * h);
+    std::mt19937 gen(static_cast<unsigned>(h));
+    for (auto& t : texture) t = gen();
+    structIELImage tex{w, h, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(texture.data())};
+    const Both oil = both_paths([&] { return run_rgb(in, w, h, IEL_OilPaintEdge); });
+    EXPECT_EQ(oil.fast, oil.plain) << "oil paint, height " << h;
+    const Both sketch = both_paths([&] {
+      return run_rgb(in, w, h, [&](auto* a, auto* b) { return IEL_Sketch_Texture(a, b, &tex, 1, 4); });
+    });
+    EXPECT_EQ(sketch.fast, sketch.plain) << "sketch on texture, height " << h;
+    const Both halftone = both_paths([&] { return run_rgb(in, w, h, IEL_Halftone_Colored_CMYK); });
+    EXPECT_EQ(halftone.fast, halftone.plain) << "halftone, height " << h;
+  }
+}
+
 namespace {
 std::vector<int> random_argb(size_t n, unsigned seed) {
   std::mt19937 gen(seed);
