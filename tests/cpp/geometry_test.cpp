@@ -376,6 +376,34 @@ TEST(Twirl, RectangleBoundsVisitedPixelsAndHalfWritesBlocks) {
   for (int at : {10 * 20 + 13, 11 * 20 + 12, 11 * 20 + 13}) EXPECT_EQ(static_cast<uint32_t>(half[at]), v);
 }
 
+TEST(Twirl, FastPathMatchesThePlainPath) {
+  const bool was = px_scalar_only();
+  // Circles cut by the picture's borders and by rectangles (the fast path
+  // visits only each row's columns inside the circle), a single row and
+  // column, both directions, half resolution.
+  struct Case {
+    int w, h, cx, cy, radius, angle, half;
+  };
+  for (const Case& c : {Case{37, 29, 18, 14, 13, 200, 0}, Case{37, 29, 0, 28, 25, -90, 1},
+                        Case{1, 41, 0, 20, 15, 300, 0}, Case{41, 1, 40, 0, 15, -360, 0}, Case{23, 31, 22, 9, 40, 45, 0},
+                        Case{64, 48, 31, 23, 5, 360, 1}, Case{129, 67, 64, 33, 50, -200, 0}}) {
+    const std::vector<int> src = random_picture(c.w, c.h, c.w * 5 + c.radius);
+    std::vector<int> fast(src.size()), plain(src.size());
+    for (auto [left, right] : {std::pair{0, c.w - 1}, {c.w / 3, c.w - 2}}) {
+      px_set_scalar_only(false);
+      ASSERT_EQ(
+          px_twirl(src.data(), fast.data(), c.w, c.h, c.cx, c.cy, c.radius, c.angle, left, right, 1, c.h - 1, c.half),
+          PX_OK);
+      px_set_scalar_only(true);
+      ASSERT_EQ(
+          px_twirl(src.data(), plain.data(), c.w, c.h, c.cx, c.cy, c.radius, c.angle, left, right, 1, c.h - 1, c.half),
+          PX_OK);
+      EXPECT_EQ(fast, plain) << c.w << "x" << c.h << " angle " << c.angle << " left " << left;
+    }
+  }
+  px_set_scalar_only(was);
+}
+
 TEST(Twirl, RefusesBadArgumentsAndLeavesOutput) {
   const auto src = random_picture(6, 6, 15);
   std::vector<int> dst(src.size(), kSentinel);

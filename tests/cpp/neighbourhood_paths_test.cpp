@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <cstring>
 #include <functional>
 #include <random>
 #include <vector>
@@ -151,6 +152,38 @@ TEST(NeighbourhoodPaths, OilPaintLevelPlaneMatchesThePlainModeFilter) {
       const Both m = both_paths([&] { return run_rgb(in, s.w, s.h, IEL_OilifyFix); });
       ASSERT_EQ(m.fast, m.plain) << s.w << "x" << s.h;
     }
+    // Three colours of three levels (one of them darkened where its blurred
+    // red is higher): windows full of tied counts, where the visit order
+    // decides the pick.
+    const unsigned char palette[3][3] = {{250, 30, 30}, {40, 40, 200}, {90, 250, 90}};
+    Bytes few(static_cast<size_t>(s.w) * s.h * 3);
+    std::mt19937 gen(seed++);
+    for (size_t i = 0; i < few.size(); i += 3) std::memcpy(&few[i], palette[gen() % 3], 3);
+    const Both r = both_paths([&] { return run_rgb(few, s.w, s.h, IEL_OilPaintEdge); });
+    ASSERT_EQ(r.fast, r.plain) << s.w << "x" << s.h << " three colours";
+  }
+}
+
+// The streamed effects keep rings of rows per band and start each band from
+// the rows above it: heights from one band to several, so that the band
+// edges fall at every offset of the rings (three, eight rows) and of the
+// dots of the halftone screens.
+TEST(NeighbourhoodPaths, StreamedBandsMatchThePlainPathAtManyHeights) {
+  const int w = 23;
+  for (int h = 30; h <= 140; h += 11) {
+    const Bytes in = smooth_rgb(w, h, static_cast<unsigned>(h));
+    std::vector<uint32_t> texture(static_cast<size_t>(w) * h);
+    std::mt19937 gen(static_cast<unsigned>(h));
+    for (auto& t : texture) t = gen();
+    structIELImage tex{w, h, IEL_FORMAT_ARGB_PACK, reinterpret_cast<unsigned char*>(texture.data())};
+    const Both oil = both_paths([&] { return run_rgb(in, w, h, IEL_OilPaintEdge); });
+    EXPECT_EQ(oil.fast, oil.plain) << "oil paint, height " << h;
+    const Both sketch = both_paths([&] {
+      return run_rgb(in, w, h, [&](auto* a, auto* b) { return IEL_Sketch_Texture(a, b, &tex, 1, 4); });
+    });
+    EXPECT_EQ(sketch.fast, sketch.plain) << "sketch on texture, height " << h;
+    const Both halftone = both_paths([&] { return run_rgb(in, w, h, IEL_Halftone_Colored_CMYK); });
+    EXPECT_EQ(halftone.fast, halftone.plain) << "halftone, height " << h;
   }
 }
 
@@ -181,9 +214,15 @@ TEST(NeighbourhoodPaths, ShaderLooksReadByTablesAsThePlainPathDivides) {
         std::vector<int> out(n, 0x5A5A5A5A);
         const std::vector<int> before = in;
         switch (which) {
-          case 0: gpu_oilPastel(in.data(), out.data(), t1.data(), s.w, s.h); break;
-          case 1: gpu_impressionist(in.data(), out.data(), t1.data(), t2.data(), s.w, s.h); break;
-          default: gpu_stucchevole(in.data(), out.data(), t1.data(), t2.data(), t3.data(), s.w, s.h); break;
+          case 0:
+            gpu_oilPastel(in.data(), out.data(), t1.data(), s.w, s.h);
+            break;
+          case 1:
+            gpu_impressionist(in.data(), out.data(), t1.data(), t2.data(), s.w, s.h);
+            break;
+          default:
+            gpu_stucchevole(in.data(), out.data(), t1.data(), t2.data(), t3.data(), s.w, s.h);
+            break;
         }
         EXPECT_EQ(in, before);
         return as_bytes(out);

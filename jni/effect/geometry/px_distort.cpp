@@ -1,4 +1,7 @@
 // Mirror, twirl and sphericity.
+#include <array>
+#include <atomic>
+#include <cmath>
 #include <cstdint>
 #include <cstring>
 
@@ -22,8 +25,8 @@ int clamp(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
 // Bilinear_Fixed's arithmetic, inlined into the samplers.
 // The three channels written out (gcc keeps the loop over them rolled).
-inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight, uint32_t bottomLeft,
-                         uint32_t bottomRight) {
+[[gnu::always_inline]] inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight,
+                                                uint32_t bottomLeft, uint32_t bottomRight) {
   auto channel = [&](int shift) {
     const int tl = (topLeft >> shift) & 255, tr = (topRight >> shift) & 255;
     const int bl = (bottomLeft >> shift) & 255, br = (bottomRight >> shift) & 255;
@@ -36,8 +39,10 @@ inline uint32_t bilinear(int fx, int fy, uint32_t topLeft, uint32_t topRight, ui
 }
 
 // The pixel at a sub-pixel position (xi + fx / 2048, yi + fy / 2048), its
-// four neighbours clamped to the picture near the border.
-inline uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, int fy) {
+// four neighbours clamped to the picture near the border. Always inlined:
+// clang kept it as a call per pixel (a fifth slower than gcc's inlined
+// loops).
+[[gnu::always_inline]] inline uint32_t sample(const int* src, int width, int height, int xi, int yi, int fx, int fy) {
   int x0 = xi, x1 = xi + 1, y0 = yi, y1 = yi + 1;
   if (!(xi >= 0 && xi < width - 1 && yi >= 0 && yi < height - 1)) {
     x0 = clamp(x0, 0, width - 1);
@@ -52,7 +57,8 @@ inline uint32_t sample(const int* src, int width, int height, int xi, int yi, in
 // Writes an interpolated colour at (x, y) with that pixel's alpha; in half
 // resolution also at its right, lower and diagonal neighbours (with the same
 // alpha of (x, y)) where they are inside the picture.
-inline void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour, bool half) {
+[[gnu::always_inline]] inline void put(const int* src, int* dst, int width, int height, int x, int y, uint32_t colour,
+                                       bool half) {
   const uint32_t alpha = static_cast<uint32_t>(src[at(x, y, width)]) & 0xFF000000u;
   const int v = static_cast<int>(alpha | (colour & 0xFFFFFFu));
   dst[at(x, y, width)] = v;
@@ -82,17 +88,38 @@ struct Sample {
   int x, xi, yi, fx, fy;
 };
 
-// Runs map(x, y, &sample) over the visited positions of the rectangle, row
-// groups on worker threads; map says whether (x, y) is moved and from where.
-// The samples of up to kChunk visited pixels of a row are worked out first
-// (their source rows fetched ahead), then read and written: the reads of
-// scattered source rows overlap instead of waiting one by one. Each visited
-// row writes only its own row (and, in half resolution, the row below it,
-// which is never visited), so the result does not depend on the split.
+// A row's mapper: map(x, sample) says whether (x, y) is moved and from
+// where; it moves nothing left of x_lo or right of x_hi.
+template <class F>
+struct RowMap {
+  long long x_lo, x_hi;
+  F map;
+};
+template <class F>
+RowMap<F> row_map(long long x_lo, long long x_hi, F map) {
+  return {x_lo, x_hi, map};
+}
+constexpr long long kNoBound = 1LL << 40;
+
+// Largest e >= 0 with e * e <= n (n >= 0).
+long long floor_sqrt(long long n) {
+  long long e = static_cast<long long>(std::sqrt(static_cast<double>(n)));
+  while (e > 0 && e * e > n) --e;
+  while ((e + 1) * (e + 1) <= n) ++e;
+  return e;
+}
+
+// Runs the mapper make_row(y) returns over the visited positions of each
+// visited row of the rectangle, row groups on worker threads. The samples of
+// up to kChunk visited pixels of a row are worked out first (their source
+// rows fetched ahead), then read and written: the reads of scattered source
+// rows overlap instead of waiting one by one. Each visited row writes only
+// its own row (and, in half resolution, the row below it, which is never
+// visited), so the result does not depend on the split.
 constexpr int kChunk = 128;
-template <class Map>
-void visit_sampled(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom,
-                   bool half, Map map) {
+template <class MakeRow>
+void visit_rows(const int* src, int* dst, int width, int height, int left, int right, int top, int bottom, bool half,
+                MakeRow make_row) {
   const int step = half ? 2 : 1;
   const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
   if (rows.count == 0 || cols.count == 0) return;
@@ -102,12 +129,20 @@ void visit_sampled(const int* src, int* dst, int width, int height, int left, in
         Sample buf[kChunk];
         for (int r = r0; r < r1; ++r) {
           const int y = rows.first + r * step;
-          for (int c0 = 0; c0 < cols.count; c0 += kChunk) {
-            const int c1 = c0 + kChunk < cols.count ? c0 + kChunk : cols.count;
+          auto row = make_row(y);
+          // The visited columns within the mapper's bounds.
+          const long long last = cols.first + static_cast<long long>(cols.count - 1) * step;
+          const long long lo = row.x_lo > cols.first ? row.x_lo : cols.first;
+          const long long hi = row.x_hi < last ? row.x_hi : last;
+          if (lo > hi) continue;
+          const int c_begin = static_cast<int>((lo - cols.first + step - 1) / step);
+          const int c_end = static_cast<int>((hi - cols.first) / step + 1);
+          for (int c0 = c_begin; c0 < c_end; c0 += kChunk) {
+            const int c1 = c0 + kChunk < c_end ? c0 + kChunk : c_end;
             int n = 0;
             for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
               Sample& sm = buf[n];
-              if (!map(x, y, sm)) continue;
+              if (!row.map(x, sm)) continue;
               sm.x = x;
               const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
               __builtin_prefetch(src + at(px, py, width));
@@ -122,6 +157,21 @@ void visit_sampled(const int* src, int* dst, int width, int height, int left, in
         }
       },
       half ? 32 : 64);
+}
+
+// The columns of row y within the disc dx^2 + dy^2 <= limit around cx (none
+// when the row misses it). Unbounded where the plain path's 32-bit squares
+// could wrap (a side above 32768), so that it moves the same pixels, and on
+// the plain path, which tests every pixel.
+struct Columns {
+  long long lo, hi;
+};
+Columns disc_columns(int width, int height, int cx, int cy, int y, long long limit) {
+  if (width > 32768 || height > 32768 || px_scalar_only()) return {-kNoBound, kNoBound};
+  const long long dy = y - cy, room = limit - dy * dy;
+  if (room < 0) return {1, 0};
+  const long long e = floor_sqrt(room);
+  return {cx - e, cx + e};
 }
 
 // sqrt of t (0..2^30) with 2^30 -> 0x80000, through the step tables.
@@ -242,6 +292,19 @@ int px_mirror(const int* src, int srcWidth, int srcHeight, int* dst, int dstWidt
 // ---- twirl and sphericity -------------------------------------------------------
 
 namespace {
+// The source copied to the output (the pixels a distortion leaves), on the
+// fast path in row bands on the workers; returns dst as memmove does.
+void* copy_picture(int* dst, const int* src, int width, int height) {
+  const size_t row = static_cast<size_t>(width), n = row * static_cast<size_t>(height);
+  const bool overlap = dst < src + n && src < dst + n;
+  if (px_scalar_only() || overlap) return std::memmove(dst, src, n * 4);
+  px_for_rows(height, [&](int y0, int y1) {
+    std::memcpy(dst + y0 * row, src + y0 * row, (y1 - y0) * row * 4);
+  });
+  return dst;
+}
+
+
 // FATAN2 with the quotient 0x20000000 / big supplied by `quotient(big)`.
 template <class Quotient>
 inline int fatan2_with(int x, int y, Quotient quotient) {
@@ -257,6 +320,118 @@ inline int fatan2_with(int x, int y, Quotient quotient) {
   if (y > 0 && x < 0) return kTurn - a;
   if (x > 0 && y < 0) return 180 * kDeg - a;
   return a + 180 * kDeg;
+}
+}  // namespace
+
+// The distance and the sine and cosine of the turned angle of a twirled pixel.
+struct TwirlAt {
+  int D, sn, cs;
+};
+
+namespace {
+// The twirl's fast path over pairs of pixels mirrored through the centre,
+// (x, y) and (2 cx - x, 2 cy - y): they have the same distance, and their
+// angles differ by exactly half a turn (the angle table is read with the
+// same quotient, and its quadrants mirror), so the turned angles differ by
+// half a turn, step k by 8192 of 16384, and the sine and cosine only change
+// sign. One pixel's twirl_at serves both; twirl_offset of the negated sine
+// and cosine places the mirror. A job is a visited row with its mirror row
+// when that is visited too (the row through the centre pairs its own
+// columns); the mirror row's columns whose mirror column is not visited are
+// worked out on their own. Each job writes only its rows (and in half
+// resolution the rows below them, never visited), so the result does not
+// depend on the split. False, with nothing written, when the job list
+// cannot be had.
+template <class At>
+bool twirl_in_pairs(const int* src, int* dst, int width, int height, int cx, int cy, int r2, int left, int right,
+                    int top, int bottom, bool half, At twirl_at) {
+  const int step = half ? 2 : 1;
+  const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
+  if (rows.count == 0 || cols.count == 0) return true;
+  const long long row_last = rows.first + static_cast<long long>(rows.count - 1) * step;
+  const long long col_last = cols.first + static_cast<long long>(cols.count - 1) * step;
+  // A mirror keeps the parity of its row and column, so within the bounds
+  // it is a visited position.
+  auto row_visited = [&](long long y) { return y >= rows.first && y <= row_last; };
+  auto col_visited = [&](long long x) { return x >= cols.first && x <= col_last; };
+  auto* jobs = static_cast<int*>(px_malloc(static_cast<size_t>(rows.count), sizeof(int)));
+  if (!jobs) return false;
+  int count = 0;
+  for (int r = 0; r < rows.count; ++r) {
+    const int y = rows.first + r * step;
+    const long long mirror = 2LL * cy - y;
+    if (!(row_visited(mirror) && mirror < y)) jobs[count++] = y;
+  }
+  struct Job {
+    int x, y, xi, yi, fx, fy;
+  };
+  constexpr int kBlock = 4;  // jobs taken at a time
+  std::atomic<int> next{0};
+  const int blocks = (count + kBlock - 1) / kBlock;
+  px_for_rows(
+      blocks,
+      [&](int, int) {
+        Job buf[2 * kChunk];
+        int n = 0;
+        auto add = [&](int x, int y, Axis ax, Axis ay) {
+          buf[n++] = {x, y, ax.whole, ay.whole, ax.weight, ay.weight};
+          const int px = clamp(ax.whole, 0, width - 1), py = clamp(ay.whole, 0, height - 1);
+          __builtin_prefetch(src + at(px, py, width));
+          __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
+        };
+        auto flush = [&] {
+          for (int i = 0; i < n; ++i) {
+            const Job& j = buf[i];
+            put(src, dst, width, height, j.x, j.y, sample(src, width, height, j.xi, j.yi, j.fx, j.fy), half);
+          }
+          n = 0;
+        };
+        // The visited columns of row y inside the circle, as c_begin..c_end.
+        auto columns = [&](int y, int* c_begin, int* c_end) {
+          const Columns in = disc_columns(width, height, cx, cy, y, static_cast<long long>(r2) - 1);
+          const long long lo = in.lo > cols.first ? in.lo : cols.first;
+          const long long hi = in.hi < col_last ? in.hi : col_last;
+          *c_begin = lo > hi ? 0 : static_cast<int>((lo - cols.first + step - 1) / step);
+          *c_end = lo > hi ? 0 : static_cast<int>((hi - cols.first) / step + 1);
+        };
+        for (int b = next.fetch_add(1); b < blocks; b = next.fetch_add(1)) {
+          for (int jb = b * kBlock; jb < count && jb < (b + 1) * kBlock; ++jb) {
+            const int y = jobs[jb];
+            const long long mirror_row = 2LL * cy - y;
+            const bool paired = row_visited(mirror_row);  // then mirror_row >= y
+            const int y2 = static_cast<int>(mirror_row);
+            int c_begin, c_end;
+            columns(y, &c_begin, &c_end);
+            for (int c = c_begin; c < c_end; ++c) {
+              const int x = cols.first + c * step;
+              const long long x2 = 2LL * cx - x;
+              const bool pair = paired && col_visited(x2) && !(y2 == y && x2 == x);
+              if (pair && y2 == y && x2 < x) continue;  // done with its mirror
+              TwirlAt a;
+              if (!twirl_at(x - cx, y - cy, &a)) continue;
+              add(x, y, twirl_offset(cx, a.D, a.sn), twirl_offset(cy, a.D, a.cs));
+              if (pair) add(static_cast<int>(x2), y2, twirl_offset(cx, a.D, -a.sn), twirl_offset(cy, a.D, -a.cs));
+              if (n >= 2 * kChunk - 1) flush();
+            }
+            if (paired && y2 != y) {
+              // The mirror row's columns whose mirror column is not visited.
+              columns(y2, &c_begin, &c_end);
+              for (int c = c_begin; c < c_end; ++c) {
+                const int x = cols.first + c * step;
+                if (col_visited(2LL * cx - x)) continue;
+                TwirlAt a;
+                if (!twirl_at(x - cx, y2 - cy, &a)) continue;
+                add(x, y2, twirl_offset(cx, a.D, a.sn), twirl_offset(cy, a.D, a.cs));
+                if (n >= 2 * kChunk - 1) flush();
+              }
+            }
+            flush();
+          }
+        }
+      },
+      1);
+  px_free(jobs);
+  return true;
 }
 }  // namespace
 
@@ -276,7 +451,7 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
         angle <= 360)) {
     return PX_ERR_NULL;
   }
-  void* copied = std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  void* copied = copy_picture(dst, src, width, height);
   // Angle 0 answers with what the copy returned (the output's address, cut
   // to an int), not 0xA000; callers of old see it that way.
   if (angle == 0) return static_cast<int>(reinterpret_cast<intptr_t>(copied));
@@ -293,8 +468,9 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
     quotients[0] = 0;  // never read: big is 0 only where the angle needs no quotient
     for (int d = 1; d < longer; ++d) quotients[d] = 0x20000000u / static_cast<uint32_t>(d);
   }
-  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
-    const int dx = x - centerX, dy = y - centerY;
+  // The turned position of the pixel (dx, dy) from the centre: its distance
+  // D and the sine and cosine of its angle; false outside the circle.
+  auto twirl_at = [&](int dx, int dy, TwirlAt* at) {
     const int d2 = dx * dx + dy * dy;
     if (d2 >= r2) return false;
     const int t = d2 * per;
@@ -320,21 +496,37 @@ int px_twirl(const int* src, int* dst, int width, int height, int centerX, int c
       cs = SIN[k - 12288];
       sn = -SIN[16384 - k];
     }
-    const Axis ax = twirl_offset(centerX, D, sn), ay = twirl_offset(centerY, D, cs);
-    sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+    *at = {D, sn, cs};
     return true;
+  };
+  // (In place, a pair's mirror would be read after being written.)
+  if (quotients && src != dst &&
+      twirl_in_pairs(src, dst, width, height, centerX, centerY, r2, left, right, top, bottom, half != 0, twirl_at)) {
+    px_free(quotients);
+    return PX_OK;
+  }
+  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
+    // Inside the circle: dx^2 + dy^2 <= r2 - 1.
+    const Columns in = disc_columns(width, height, centerX, centerY, y, static_cast<long long>(r2) - 1);
+    return row_map(in.lo, in.hi, [&, y](int x, Sample& sm) {
+      TwirlAt at;
+      if (!twirl_at(x - centerX, y - centerY, &at)) return false;
+      const Axis ax = twirl_offset(centerX, at.D, at.sn), ay = twirl_offset(centerY, at.D, at.cs);
+      sm = {x, ax.whole, ay.whole, ax.weight, ay.weight};
+      return true;
+    });
   });
   px_free(quotients);
   return PX_OK;
 }
 
-int px_sphericity(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius,
-                  int strength, int left, int right, int top, int bottom, int half) {
+int px_sphericity(const int* src, int* dst, int width, int height, int centerX, int centerY, int radius, int strength,
+                  int left, int right, int top, int bottom, int half) {
   if (!(centerX >= 0 && centerX < width && centerY >= 0 && centerY < height && radius > 0 && strength >= -100 &&
         strength <= 100)) {
     return PX_ERR_NULL;
   }
-  std::memmove(dst, src, static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+  copy_picture(dst, src, width, height);
   if (bottom < top) return PX_OK;
   // The working radius is enlarged on purpose (about 1.4 times).
   const int R2 = (500 * radius * radius + 128) >> 8;
@@ -357,42 +549,59 @@ int px_sphericity(const int* src, int* dst, int width, int height, int centerX, 
       steps[i] = {m, Dn, 0x40000000 / Dn, divisor_of(static_cast<uint32_t>(Dn))};
     }
   }
-  visit_sampled(src, dst, width, height, left, right, top, bottom, half != 0, [&](int x, int y, Sample& sm) {
-    const int dx = x - centerX, dy = y - centerY;
-    const int d2 = dx * dx + dy * dy;
-    if (d2 > R2) return false;
-    const int i = (per * d2) >> 22;
-    const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
-    int xi, yi, fx, fy;
+  visit_rows(src, dst, width, height, left, right, top, bottom, half != 0, [&](int y) {
+    // On the fast path the row's source row and its weight for every step:
+    // they depend on the row and the step only.
+    struct Down {
+      int yi, fy;
+    };
+    std::array<Down, 257> down;
     if (fast) {
-      const Step& st = steps[(i >= 0 && i < 256) ? i : 256];
-      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
-      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + st.m * static_cast<uint32_t>(centerY));
-      xi = divide(X, st.div);
-      yi = divide(Y, st.div);
-      fx = (st.inv * (X - st.Dn * xi)) >> 19;
-      fy = (st.inv * (Y - st.Dn * yi)) >> 19;
-    } else if (strength >= 0) {
-      const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
-      const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
-      const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));
-      const int Dn = static_cast<int>(m + 0x40000);
-      xi = X / Dn;
-      yi = Y / Dn;
-      const int inv = 0x40000000 / Dn;
-      fx = (inv * (X - Dn * xi)) >> 19;
-      fy = (inv * (Y - Dn * yi)) >> 19;
-    } else {
-      const int n = (static_cast<int>(L) * (-30 * strength)) >> 12;
-      const int X = static_cast<int>(static_cast<uint32_t>(x) << 18) + signed_product(dx, n);
-      const int Y = static_cast<int>(static_cast<uint32_t>(y) << 18) + signed_product(dy, n);
-      xi = X >> 18;
-      yi = Y >> 18;
-      fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
-      fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
+      for (int i = 0; i <= 256; ++i) {
+        const Step& st = steps[i];
+        const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + st.m * static_cast<uint32_t>(centerY));
+        const int yi = divide(Y, st.div);
+        down[i] = {yi, (st.inv * (Y - st.Dn * yi)) >> 19};
+      }
     }
-    sm = {x, xi, yi, fx, fy};
-    return true;
+    const Columns in = disc_columns(width, height, centerX, centerY, y, R2);
+    return row_map(in.lo, in.hi, [&, down, y](int x, Sample& sm) {
+      const int dx = x - centerX, dy = y - centerY;
+      const int d2 = dx * dx + dy * dy;
+      if (d2 > R2) return false;
+      const int i = (per * d2) >> 22;
+      const uint32_t L = (i >= 0 && i < 256) ? EXP_n7[i] >> 7 : 0;
+      int xi, yi, fx, fy;
+      if (fast) {
+        const int at_step = (i >= 0 && i < 256) ? i : 256;
+        const Step& st = steps[at_step];
+        const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + st.m * static_cast<uint32_t>(centerX));
+        xi = divide(X, st.div);
+        fx = (st.inv * (X - st.Dn * xi)) >> 19;
+        yi = down[at_step].yi;
+        fy = down[at_step].fy;
+      } else if (strength >= 0) {
+        const uint32_t m = (L * 75u * static_cast<uint32_t>(strength)) >> 12;
+        const int X = static_cast<int>((static_cast<uint32_t>(x) << 18) + m * static_cast<uint32_t>(centerX));
+        const int Y = static_cast<int>((static_cast<uint32_t>(y) << 18) + m * static_cast<uint32_t>(centerY));
+        const int Dn = static_cast<int>(m + 0x40000);
+        xi = X / Dn;
+        yi = Y / Dn;
+        const int inv = 0x40000000 / Dn;
+        fx = (inv * (X - Dn * xi)) >> 19;
+        fy = (inv * (Y - Dn * yi)) >> 19;
+      } else {
+        const int n = (static_cast<int>(L) * (-30 * strength)) >> 12;
+        const int X = static_cast<int>(static_cast<uint32_t>(x) << 18) + signed_product(dx, n);
+        const int Y = static_cast<int>(static_cast<uint32_t>(y) << 18) + signed_product(dy, n);
+        xi = X >> 18;
+        yi = Y >> 18;
+        fx = (X - static_cast<int>(static_cast<uint32_t>(xi) << 18)) >> 7;
+        fy = (Y - static_cast<int>(static_cast<uint32_t>(yi) << 18)) >> 7;
+      }
+      sm = {x, xi, yi, fx, fy};
+      return true;
+    });
   });
   return PX_OK;
 }

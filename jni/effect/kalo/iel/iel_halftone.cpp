@@ -192,9 +192,74 @@ const HalftoneTables& halftone_tables() {
   return tables;
 }
 
-// The separation by the tables, rows on worker threads.
+// The largest dot radius any channel draws.
+constexpr int kMaxDotRadius = 5;
+
+// The rows y0..y1-1 of a filled dot, as IEL_Halftone_bresan_circle draws it
+// with its pixels outside the picture skipped.
+void dot_rows(unsigned char* screen, int w, int y0, int y1, int cx, int cy, int r) {
+  auto span = [&](int y, int xa, int xb) {
+    if (y < y0 || y >= y1) return;
+    xa = xa < 0 ? 0 : xa;
+    xb = xb > w - 1 ? w - 1 : xb;
+    if (xa <= xb) std::memset(screen + static_cast<size_t>(y) * w + xa, 255, static_cast<size_t>(xb - xa + 1));
+  };
+  int x = r, y = 0, err = 1 - r;
+  while (x >= y) {
+    span(cy + y, cx - x, cx + x);
+    span(cy - y, cx - x, cx + x);
+    span(cy + x, cx - y, cx + y);
+    span(cy - x, cx - y, cx + y);
+    ++y;
+    if (err < 0) {
+      err += 2 * y + 1;
+    } else {
+      --x;
+      err += 2 * (y - x) + 1;
+    }
+  }
+}
+
+// IEL_Halftone_HalftonePerChannel over row bands: a screen is the union of
+// its dots, so each band clears its own rows and draws the part of every dot
+// centred within kMaxDotRadius rows of them, with the same dot centres (the
+// same expressions) and radii.
+void screen_banded(const unsigned char* plane, unsigned char* screen, int width, int height, int cell, double slope,
+                   int channel) {
+  const double norm = std::sqrt(1 + slope * slope);
+  const double dx = 1 / norm, dy = slope / norm;
+  const double nx = -dy, ny = dx;
+  const int spacing = (channel == 1 ? 4 : 2) * cell;
+  const double side = width > height ? width : height;
+  double amin = 0, amax = 0, bmin = 0, bmax = 0;
+  const double corners[4][2] = {{0, 0}, {side, 0}, {0, side}, {side, side}};
+  for (const auto& c : corners) {
+    const double a = c[0] * dx + c[1] * dy, b = c[0] * nx + c[1] * ny;
+    amin = a < amin ? a : amin, amax = a > amax ? a : amax;
+    bmin = b < bmin ? b : bmin, bmax = b > bmax ? b : bmax;
+  }
+  const int j0 = static_cast<int>(std::floor(bmin / spacing)), j1 = static_cast<int>(std::ceil(bmax / spacing));
+  const int t0 = static_cast<int>(std::floor(amin / cell)), t1 = static_cast<int>(std::ceil(amax / cell));
+  px_for_rows(height, [&](int y0, int y1) {
+    std::memset(screen + static_cast<size_t>(y0) * width, 0, static_cast<size_t>(y1 - y0) * width);
+    for (int j = j0; j <= j1; ++j) {
+      const double ox = j * spacing * nx, oy = j * spacing * ny;
+      for (int t = t0; t <= t1; ++t) {
+        const int cx = static_cast<int>(std::floor(ox + t * cell * dx + 0.5));
+        const int cy = static_cast<int>(std::floor(oy + t * cell * dy + 0.5));
+        if (cx < 0 || cx >= width || cy < 0 || cy >= height) continue;
+        if (cy + kMaxDotRadius < y0 || cy - kMaxDotRadius >= y1) continue;
+        const int r = IEL_Halftone_AnalyseCircleRadius(plane, width, height, cx, cy, cell, channel);
+        if (r > 0) dot_rows(screen, width, y0, y1, cx, cy, r);
+      }
+    }
+  });
+}
+
+// The separation by the tables, rows on worker threads; the black ink is
+// left to the recombination, which reads the input again.
 void separate_fast(const unsigned char* rgb, int width, int height, unsigned char* c, unsigned char* m,
-                   unsigned char* y, unsigned char* k) {
+                   unsigned char* y) {
   const HalftoneTables& t = halftone_tables();
   const size_t row = static_cast<size_t>(width);
   px_for_rows(height, [&](int y0, int y1) {
@@ -202,34 +267,61 @@ void separate_fast(const unsigned char* rgb, int width, int height, unsigned cha
       const unsigned char* p = rgb + 3 * i;
       int mx = p[0] > p[1] ? p[0] : p[1];
       mx = p[2] > mx ? p[2] : mx;
-      if (mx == 0) {  // pure black: the inks are 1, the black 255
+      if (mx == 0) {  // pure black: the inks are 1
         c[i] = m[i] = y[i] = 1;
-        k[i] = 255;
         continue;
       }
       c[i] = t.ink[mx][p[0]];
       m[i] = t.ink[mx][p[1]];
       y[i] = t.ink[mx][p[2]];
-      k[i] = t.black[mx];
     }
   });
 }
 
-// Recombination by the tables and the darken-only blend with the input (an
-// output that is the input itself has already been overwritten when the
-// plain path blends, so it takes the recombined pixels as they are).
-void recombine_fast(const unsigned char* c, const unsigned char* m, const unsigned char* y, const unsigned char* k,
-                    const unsigned char* input, unsigned char* rgb, int width, int height) {
+// Recombination of the screens and the darken-only blend with the input. A
+// screen is 0 or 255, and the recombined channel of ink 255 is 0, so each
+// channel is the recombined channel of ink 0 for the pixel's black (which
+// is the black ink of its largest channel) with the screen's bits cleared,
+// then the smaller of that and the input (an output that is the input
+// itself has already been overwritten when the plain path blends, so it
+// takes the recombined pixels as they are).
+void recombine_fast(const unsigned char* c, const unsigned char* m, const unsigned char* y, const unsigned char* input,
+                    unsigned char* rgb, int width, int height) {
   const HalftoneTables& t = halftone_tables();
+  unsigned char base[256];  // by largest channel
+  for (int mx = 0; mx < 256; ++mx) base[mx] = t.rgb[t.black[mx]][0];
   const size_t row = static_cast<size_t>(width);
   const bool in_place = input == rgb;
   px_for_rows(height, [&](int y0, int y1) {
-    for (size_t i = y0 * row; i < y1 * row; ++i) {
-      const unsigned char* ink = t.rgb[k[i]];
-      const unsigned char v[3] = {ink[c[i]], ink[m[i]], ink[y[i]]};
-      for (int ch = 0; ch < 3; ++ch) {
-        const unsigned char a = input[3 * i + ch];
-        rgb[3 * i + ch] = !in_place && a < v[ch] ? a : v[ch];
+    unsigned char b[256];
+    for (int yy = y0; yy < y1; ++yy) {
+      for (size_t x0 = 0; x0 < row; x0 += sizeof b) {
+        const size_t len = row - x0 < sizeof b ? row - x0 : sizeof b;
+        const size_t i0 = yy * row + x0;
+        const unsigned char* p = input + 3 * i0;
+        for (size_t x = 0; x < len; ++x) {
+          int mx = p[3 * x] > p[3 * x + 1] ? p[3 * x] : p[3 * x + 1];
+          mx = p[3 * x + 2] > mx ? p[3 * x + 2] : mx;
+          b[x] = base[mx];
+        }
+        unsigned char* o = rgb + 3 * i0;
+        const unsigned char *cs = c + i0, *ms = m + i0, *ys = y + i0;
+        if (in_place) {
+          for (size_t x = 0; x < len; ++x) {
+            o[3 * x] = static_cast<unsigned char>(b[x] & ~cs[x]);
+            o[3 * x + 1] = static_cast<unsigned char>(b[x] & ~ms[x]);
+            o[3 * x + 2] = static_cast<unsigned char>(b[x] & ~ys[x]);
+          }
+        } else {
+          for (size_t x = 0; x < len; ++x) {
+            const unsigned char v0 = static_cast<unsigned char>(b[x] & ~cs[x]);
+            const unsigned char v1 = static_cast<unsigned char>(b[x] & ~ms[x]);
+            const unsigned char v2 = static_cast<unsigned char>(b[x] & ~ys[x]);
+            o[3 * x] = p[3 * x] < v0 ? p[3 * x] : v0;
+            o[3 * x + 1] = p[3 * x + 1] < v1 ? p[3 * x + 1] : v1;
+            o[3 * x + 2] = p[3 * x + 2] < v2 ? p[3 * x + 2] : v2;
+          }
+        }
       }
     }
   });
@@ -247,11 +339,14 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
   const size_t n = static_cast<size_t>(w) * static_cast<size_t>(h);
   const bool fast = !px_scalar_only();
   if (!fast) std::memcpy(output->buffer, input->buffer, n * 3);
+  // Cyan, magenta, yellow, black and a spare plane for the screens (the
+  // fast path does without the black plane).
   unsigned char* planes[5] = {};
   bool ok = true;
-  for (auto& p : planes) {
-    p = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n)));
-    ok = ok && p;
+  for (int i = 0; i < 5; ++i) {
+    if (fast && i == 3) continue;
+    planes[i] = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n)));
+    ok = ok && planes[i];
   }
   if (!ok) {
     IF_ERROR("Failed to allocate \n");
@@ -260,19 +355,20 @@ int IEL_Halftone_Colored_CMYK(structIELImage* input, structIELImage* output) {
     if (fast) std::memcpy(output->buffer, input->buffer, n * 3);
     return IEL_ERR_ALLOC;
   }
-  if (fast) separate_fast(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
+  if (fast) separate_fast(input->buffer, w, h, planes[0], planes[1], planes[2]);
   else IEL_Halftone_RGBtoCMYKconversion(input->buffer, w, h, planes[0], planes[1], planes[2], planes[3]);
   static const double kSlopes[3] = {3.732, 1.0, 0.2679};
   static const int kPlane[3] = {0, 2, 1};  // cyan, yellow, magenta
   for (int i = 0; i < 3; ++i) {
     const int p = kPlane[i];
-    IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    if (fast) screen_banded(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
+    else IEL_Halftone_HalftonePerChannel(planes[p], planes[4], w, h, 9, kSlopes[i], i + 1);
     unsigned char* t = planes[p];
     planes[p] = planes[4];
     planes[4] = t;
   }
   if (fast) {
-    recombine_fast(planes[0], planes[1], planes[2], planes[3], input->buffer, output->buffer, w, h);
+    recombine_fast(planes[0], planes[1], planes[2], input->buffer, output->buffer, w, h);
   } else {
     IEL_Halftone_CMYKtoRGBconversion(planes[0], planes[1], planes[2], planes[3], output->buffer, w, h);
     IEL_DarkenOnlyBlendingRGB888(input, output);

@@ -248,8 +248,160 @@ int IEL_OilifyFix(structIELImage* input, structIELImage* output) {
   return IEL_OK;
 }
 
+namespace {
+typedef int8_t i8x16 __attribute__((vector_size(16)));
+
+// Oil paint of packed RGB in one pass over row bands, with no picture-sized
+// buffer: each band keeps the darkened rows (the work picture) and their
+// 16-level luminances in rings of three rows, each padded by a copy of its
+// edge pixel on either side, so that the border windows read the same
+// clamped neighbours as the plain path.
+//
+// Only the blurred red decides whether a pixel darkens, so only the red of
+// the 3 x 3 binomial blur is formed (a column pass, then a row pass). The
+// mode filter visits its window in the plain order k = 0..8 (left, middle,
+// right column, each top to bottom); the plain running maximum picks the
+// first visit whose running count of its level reaches the window's highest
+// count, so for sixteen pixels at once each visit's running count is
+// 1 + (earlier visits of the same level), their maximum is taken, and the
+// first visit reaching it is the pick.
+struct OilBand {
+  unsigned char* work[3];   // (w + 2) pixels, padded
+  unsigned char* level[3];  // w + 2 + 16 levels, padded
+  uint16_t* column;         // red column sums, w
+  unsigned char* pick;      // visit picked per pixel, w + 16
+};
+
+size_t oil_band_bytes(int w) {
+  const size_t wp = static_cast<size_t>(w) + 2;
+  auto up = [](size_t n) { return (n + 15) & ~static_cast<size_t>(15); };
+  return 3 * up(3 * wp) + 3 * up(wp + 16) + up(2 * static_cast<size_t>(w)) + up(static_cast<size_t>(w) + 16);
+}
+
+OilBand oil_band(unsigned char* base, int w) {
+  const size_t wp = static_cast<size_t>(w) + 2;
+  auto up = [](size_t n) { return (n + 15) & ~static_cast<size_t>(15); };
+  OilBand b;
+  for (auto& r : b.work) {
+    r = base;
+    base += up(3 * wp);
+  }
+  for (auto& r : b.level) {
+    r = base;
+    std::memset(r, 0, wp + 16);  // the lanes past the row read defined bytes
+    base += up(wp + 16);
+  }
+  b.column = reinterpret_cast<uint16_t*>(base);
+  base += up(2 * static_cast<size_t>(w));
+  b.pick = base;
+  return b;
+}
+
+// Work row y (the pixel, or its channels squared over 255 where the blurred
+// red is at least two above its own) and its levels, padded.
+void oil_work_row(const unsigned char* src, int w, int h, int y, uint16_t* column, unsigned char* work,
+                  unsigned char* level) {
+  const size_t row = static_cast<size_t>(w) * 3;
+  const unsigned char* up = src + (y > 0 ? y - 1 : 0) * row;
+  const unsigned char* mid = src + y * row;
+  const unsigned char* down = src + (y < h - 1 ? y + 1 : h - 1) * row;
+  for (int x = 0; x < w; ++x) column[x] = static_cast<uint16_t>(up[3 * x] + 2 * mid[3 * x] + down[3 * x]);
+  unsigned char* o = work + 3;
+  unsigned char* l = level + 1;
+  for (int x = 0; x < w; ++x) {
+    const int xl = x > 0 ? x - 1 : 0, xr = x < w - 1 ? x + 1 : w - 1;
+    const int red = (column[xl] + 2 * column[x] + column[xr]) >> 4;
+    const unsigned char* p = mid + 3 * x;
+    unsigned char* q = o + 3 * x;
+    if (red - p[0] >= 2) {
+      q[0] = static_cast<unsigned char>(p[0] * p[0] / 255);
+      q[1] = static_cast<unsigned char>(p[1] * p[1] / 255);
+      q[2] = static_cast<unsigned char>(p[2] * p[2] / 255);
+    } else {
+      q[0] = p[0];
+      q[1] = p[1];
+      q[2] = p[2];
+    }
+    l[x] = static_cast<unsigned char>(IEL_LumaSum(q[0], q[1], q[2]) >> 14);
+  }
+  std::memcpy(work, o, 3);
+  std::memcpy(o + row, o + row - 3, 3);
+  level[0] = l[0];
+  l[w] = l[w - 1];
+}
+
+i8x16 load16(const unsigned char* p) {
+  i8x16 v;
+  std::memcpy(&v, p, 16);
+  return v;
+}
+
+// The mode filter's picks for one output row from the padded level rows
+// above, at and below it.
+void oil_picks(const unsigned char* const rows[3], int w, unsigned char* pick) {
+  for (int x = 0; x < w; x += 16) {
+    i8x16 lv[9], count[9];
+    for (int k = 0; k < 9; ++k) lv[k] = load16(rows[k % 3] + x + k / 3);
+    i8x16 best = {};
+    for (int k = 0; k < 9; ++k) {
+      i8x16 c = {1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1};
+      for (int j = 0; j < k; ++j) c -= static_cast<i8x16>(lv[j] == lv[k]);
+      count[k] = c;
+      const i8x16 more = static_cast<i8x16>(c > best);
+      best = (c & more) | (best & ~more);
+    }
+    i8x16 first = {};
+    for (int k = 8; k >= 0; --k) {
+      const i8x16 hit = static_cast<i8x16>(count[k] == best);
+      first = (hit & static_cast<int8_t>(k)) | (first & ~hit);
+    }
+    std::memcpy(pick + x, &first, 16);
+  }
+}
+
+bool oil_paint_fused(const unsigned char* src, unsigned char* dst, int w, int h) {
+  const int bands = px_band_count(h, 64);
+  const size_t per_band = oil_band_bytes(w);
+  const size_t total = per_band * static_cast<size_t>(bands);
+  auto* scratch = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
+  if (!scratch) return false;
+  std::atomic<int> next{0};
+  const size_t row = static_cast<size_t>(w) * 3;
+  px_for_rows(h, [&](int y0, int y1) {
+    OilBand b = oil_band(scratch + per_band * static_cast<size_t>(next++), w);
+    const int first = y0 > 0 ? y0 - 1 : 0;
+    for (int y = first; y <= y0; ++y) oil_work_row(src, w, h, y, b.column, b.work[y % 3], b.level[y % 3]);
+    for (int y = y0; y < y1; ++y) {
+      const int ym = y > 0 ? y - 1 : 0, yp = y < h - 1 ? y + 1 : h - 1;
+      if (yp > y) oil_work_row(src, w, h, yp, b.column, b.work[yp % 3], b.level[yp % 3]);
+      const unsigned char* levels[3] = {b.level[ym % 3], b.level[y % 3], b.level[yp % 3]};
+      oil_picks(levels, w, b.pick);
+      // Visit k reads column x + k / 3 - 1 of row k % 3 of the window.
+      const unsigned char* from[9];
+      for (int k = 0; k < 9; ++k) from[k] = b.work[(k % 3 == 0 ? ym : k % 3 == 1 ? y : yp) % 3] + 3 * (k / 3);
+      unsigned char* o = dst + y * row;
+      for (int x = 0; x < w; ++x) {
+        const unsigned char* p = from[b.pick[x]] + 3 * x;
+        o[3 * x] = p[0];
+        o[3 * x + 1] = p[1];
+        o[3 * x + 2] = p[2];
+      }
+    }
+  });
+  IF_FREE(scratch);
+  return true;
+}
+}  // namespace
+
 int IEL_OilPaintEdge(structIELImage* input, structIELImage* output) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
+  // (An output that is the input itself takes the route through a whole
+  // work picture: the bands would overwrite rows their neighbours read.)
+  if (!px_scalar_only() && input->buffer != output->buffer) {
+    if (oil_paint_fused(input->buffer, output->buffer, input->width, input->height)) return IEL_OK;
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
   const size_t n = pixel_count(input);
   auto* work = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 3)));
   if (!work) {
@@ -597,13 +749,156 @@ int sketch_planes(structIELImage* input, structIELImage* output, int strokeDarkn
   IF_FREE(a);
   return rc;
 }
+
+// The sketch (and, given a texture, its blend with the texture) streamed
+// over row bands without picture-sized planes. Each band keeps the inverted
+// luma of the rows its blur window spans in a ring of eight rows, the blur's
+// running column sums, and the dodged rows (luma * 255 over 255 minus the
+// blurred inverse) in a ring of three; every output row is the 3 x 3 box of
+// those, darkened and, with a texture, blended with it through a table of
+// every (darkened grey, texture byte) pair. The same sums and divisions as
+// the planes above, row borders clamped the same way.
+struct SketchBand {
+  unsigned char* inverse[8];
+  unsigned char* dodged[3];
+  uint32_t* column;
+  uint16_t* triple;
+  unsigned char* grey;
+};
+
+int sketch_streamed(const unsigned char* src, unsigned char* dst, int w, int h, int strokeDarkness, int blurLevel,
+                    const unsigned char* texture) {
+  IELProgressScope progress;
+  static const int kSizes[5] = {3, 5, 7, 9, 11};
+  const int r = kSizes[blurLevel] / 2, area = kSizes[blurLevel] * kSizes[blurLevel];
+  const size_t wu = (static_cast<size_t>(w) + 15) & ~static_cast<size_t>(15);
+  const size_t per_band = 11 * wu + 4 * wu + 2 * wu + wu;
+  const int bands = px_band_count(h, 16);
+  const size_t table_bytes = texture ? 65536 : 0;
+  const size_t total = per_band * static_cast<size_t>(bands) + table_bytes;
+  auto* scratch = total <= 0x7FFFFFFF ? static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(total))) : nullptr;
+  if (!scratch) {
+    IF_ERROR("Failed to allocate \n");
+    return IEL_ERR_ALLOC;
+  }
+  // The darkening of every grey; the texture blend of every darkened grey
+  // and texture byte.
+  unsigned char dark[256];
+  for (int c = 0; c < 256; ++c) {
+    int v = c;
+    for (int k = 0; k < strokeDarkness; ++k) v = v * v >> 8;
+    dark[c] = static_cast<unsigned char>(v);
+  }
+  unsigned char* blend = scratch + per_band * static_cast<size_t>(bands);
+  if (texture) {
+    for (int s = 0; s < 256; ++s)
+      for (int t = 0; t < 256; ++t) {
+        blend[s * 256 + t] = static_cast<unsigned char>(clampi((s * s + (t - 15) * (255 - s)) / 255, 0, 255));
+      }
+  }
+  progress.start(static_cast<uint32_t>(h));
+  std::atomic<bool> stopped{false};
+  std::atomic<int> next_band{0};
+  const size_t row = static_cast<size_t>(w);
+  px_for_rows(
+      h,
+      [&](int y0, int y1) {
+        unsigned char* base = scratch + per_band * static_cast<size_t>(next_band.fetch_add(1));
+        SketchBand b;
+        for (auto& v : b.inverse) v = base, base += wu;
+        for (auto& v : b.dodged) v = base, base += wu;
+        b.column = reinterpret_cast<uint32_t*>(base);
+        base += 4 * wu;
+        b.triple = reinterpret_cast<uint16_t*>(base);
+        base += 2 * wu;
+        b.grey = base;
+        int made = -1;  // inverse rows 0..made are in the ring (the last eight of them)
+        auto inverse = [&](int y) {
+          y = clampi(y, 0, h - 1);
+          for (; made < y; ++made) {
+            const unsigned char* p = src + (made + 1) * row * 3;
+            unsigned char* a = b.inverse[(made + 1) & 7];
+            for (int x = 0; x < w; ++x) a[x] = static_cast<unsigned char>(255 - luma(p + 3 * x));
+          }
+          return b.inverse[y & 7];
+        };
+        // Dodged rows from the first one the band reads on; the column sums
+        // follow the row being dodged.
+        int dodge_row = clampi(y0 - 1, 0, h - 1);
+        made = dodge_row - r - 1 < -1 ? -1 : dodge_row - r - 1;
+        for (int x = 0; x < w; ++x) b.column[x] = 0;
+        for (int dy = -r; dy <= r; ++dy) {
+          const unsigned char* a = inverse(dodge_row + dy);
+          for (int x = 0; x < w; ++x) b.column[x] += a[x];
+        }
+        auto dodge = [&](int y) {
+          for (; dodge_row < y; ++dodge_row) {
+            const unsigned char* add = inverse(dodge_row + 1 + r);
+            const unsigned char* sub = inverse(dodge_row - r);
+            for (int x = 0; x < w; ++x) b.column[x] += static_cast<uint32_t>(add[x]) - sub[x];
+          }
+          const unsigned char* a = inverse(y);
+          unsigned char* o = b.dodged[y % 3];
+          const uint32_t* col = b.column;
+          uint32_t acc = 0;
+          for (int dx = -r; dx <= r; ++dx) acc += col[clampi(dx, 0, w - 1)];
+          for (int x = 0; x < w; ++x) {
+            const int d = 255 - static_cast<int>(divide(acc, area));
+            const uint32_t v = divide(static_cast<uint32_t>((255 - a[x]) * 255), d < 4 ? 4 : d);
+            o[x] = static_cast<unsigned char>(v > 255 ? 255 : v);
+            acc += col[x + r + 1 < w ? x + r + 1 : w - 1] - col[x - r > 0 ? x - r : 0];
+          }
+        };
+        dodge(dodge_row);
+        if (y0 > dodge_row) dodge(y0);
+        for (int y = y0; y < y1; ++y) {
+          if (progress.cancelled() || stopped.load(std::memory_order_relaxed)) {
+            stopped.store(true);
+            return;
+          }
+          const int ym = y > 0 ? y - 1 : 0, yp = y < h - 1 ? y + 1 : h - 1;
+          if (yp > y) dodge(yp);
+          const unsigned char* u = b.dodged[ym % 3];
+          const unsigned char* m = b.dodged[y % 3];
+          const unsigned char* d = b.dodged[yp % 3];
+          uint16_t* t3 = b.triple;
+          for (int x = 0; x < w; ++x) t3[x] = static_cast<uint16_t>(u[x] + m[x] + d[x]);
+          uint32_t acc = t3[0] + t3[0] + t3[w > 1 ? 1 : 0];
+          unsigned char* g = b.grey;
+          for (int x = 0; x < w; ++x) {
+            g[x] = dark[divide(acc, 9)];
+            acc += t3[x + 2 < w ? x + 2 : w - 1] - t3[x - 1 > 0 ? x - 1 : 0];
+          }
+          unsigned char* o = dst + y * row * 3;
+          if (texture) {
+            const unsigned char* t = texture + y * row * 4;
+            for (int x = 0; x < w; ++x) {
+              uint32_t tp;
+              std::memcpy(&tp, t + 4 * x, 4);
+              g[x] = blend[g[x] * 256 + (tp & 0xFF)];
+            }
+          }
+          for (int x = 0; x < w; ++x) o[3 * x] = o[3 * x + 1] = o[3 * x + 2] = g[x];
+          progress.advance();
+        }
+      },
+      16);
+  IF_FREE(scratch);
+  return stopped.load() ? IEL_ERR_CANCELLED : IEL_OK;
+}
 }  // namespace
 
 int IEL_SketchNew2(structIELImage* input, structIELImage* output, int strokeDarkness, int blurLevel) {
   if (int rc = IEL_CheckEffectImages(__func__, input, output, 1, 1, rgb888_only)) return rc;
   strokeDarkness = clampi(strokeDarkness, 1, 3);
   blurLevel = clampi(blurLevel, 1, 2);
-  if (!px_scalar_only()) return sketch_planes(input, output, strokeDarkness, blurLevel);
+  if (!px_scalar_only()) {
+    // (In place, the planes: the streamed bands would overwrite rows their
+    // neighbours still read.)
+    if (input->buffer == output->buffer) return sketch_planes(input, output, strokeDarkness, blurLevel);
+    return sketch_streamed(input->buffer, output->buffer, input->width, input->height, strokeDarkness, blurLevel,
+                           nullptr);
+  }
   const size_t n = pixel_count(input);
   auto* grey = static_cast<unsigned char*>(IF_MALLOC(static_cast<int>(n * 3)));
   if (!grey) {
@@ -643,9 +938,18 @@ int IEL_Sketch_Texture(structIELImage* input, structIELImage* output, structIELI
     IF_ERROR("Texture image structure in NULL \n");
     return IEL_ERR_NULL;
   }
+  const bool fits =
+      texture->width == input->width && texture->height == input->height && texture->format == IEL_FORMAT_ARGB_PACK;
+  if (fits && !px_scalar_only()) {
+    // The sketch's checks as it logs them, then its clamped darkness 3 and
+    // blur level 2, blended as it goes.
+    if (int rc = IEL_CheckEffectImages("IEL_SketchNew2", input, output, 1, 1, rgb888_only)) return rc;
+    if (input->buffer != output->buffer) {
+      return sketch_streamed(input->buffer, output->buffer, input->width, input->height, 3, 2, texture->buffer);
+    }
+  }
   if (int rc = IEL_SketchNew2(input, output, 3, 3)) return rc;
-  if (texture->width != input->width || texture->height != input->height ||
-      texture->format != IEL_FORMAT_ARGB_PACK) {
+  if (!fits) {
     IF_ERROR("Textrue image dims(%d x %d) MUST match Input Dims \n", texture->width, texture->height);
     return IEL_ERR_DIMENSION;
   }
