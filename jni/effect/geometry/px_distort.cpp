@@ -123,40 +123,46 @@ void visit_rows(const int* src, int* dst, int width, int height, int left, int r
   const int step = half ? 2 : 1;
   const Span rows = span(top, bottom, height, step), cols = span(left, right, width, step);
   if (rows.count == 0 || cols.count == 0) return;
-  px_for_rows(
-      rows.count,
-      [&](int r0, int r1) {
-        Sample buf[kChunk];
-        for (int r = r0; r < r1; ++r) {
-          const int y = rows.first + r * step;
-          auto row = make_row(y);
-          // The visited columns within the mapper's bounds.
-          const long long last = cols.first + static_cast<long long>(cols.count - 1) * step;
-          const long long lo = row.x_lo > cols.first ? row.x_lo : cols.first;
-          const long long hi = row.x_hi < last ? row.x_hi : last;
-          if (lo > hi) continue;
-          const int c_begin = static_cast<int>((lo - cols.first + step - 1) / step);
-          const int c_end = static_cast<int>((hi - cols.first) / step + 1);
-          for (int c0 = c_begin; c0 < c_end; c0 += kChunk) {
-            const int c1 = c0 + kChunk < c_end ? c0 + kChunk : c_end;
-            int n = 0;
-            for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
-              Sample& sm = buf[n];
-              if (!row.map(x, sm)) continue;
-              sm.x = x;
-              const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
-              __builtin_prefetch(src + at(px, py, width));
-              __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
-              ++n;
-            }
-            for (int i = 0; i < n; ++i) {
-              const Sample& sm = buf[i];
-              put(src, dst, width, height, sm.x, y, sample(src, width, height, sm.xi, sm.yi, sm.fx, sm.fy), half);
-            }
-          }
+  // In place, a row reads pixels that rows above it have written: the rows
+  // then run in order on the calling thread, as the plain path runs them.
+  const size_t pixels = static_cast<size_t>(width) * static_cast<size_t>(height);
+  const bool overlap = dst < src + pixels && src < dst + pixels;
+  auto band = [&](int r0, int r1) {
+    Sample buf[kChunk];
+    for (int r = r0; r < r1; ++r) {
+      const int y = rows.first + r * step;
+      auto row = make_row(y);
+      // The visited columns within the mapper's bounds.
+      const long long last = cols.first + static_cast<long long>(cols.count - 1) * step;
+      const long long lo = row.x_lo > cols.first ? row.x_lo : cols.first;
+      const long long hi = row.x_hi < last ? row.x_hi : last;
+      if (lo > hi) continue;
+      const int c_begin = static_cast<int>((lo - cols.first + step - 1) / step);
+      const int c_end = static_cast<int>((hi - cols.first) / step + 1);
+      for (int c0 = c_begin; c0 < c_end; c0 += kChunk) {
+        const int c1 = c0 + kChunk < c_end ? c0 + kChunk : c_end;
+        int n = 0;
+        for (int c = c0, x = cols.first + c0 * step; c < c1; ++c, x += step) {
+          Sample& sm = buf[n];
+          if (!row.map(x, sm)) continue;
+          sm.x = x;
+          const int px = clamp(sm.xi, 0, width - 1), py = clamp(sm.yi, 0, height - 1);
+          __builtin_prefetch(src + at(px, py, width));
+          __builtin_prefetch(src + at(px, py + 1 < height ? py + 1 : py, width));
+          ++n;
         }
-      },
-      half ? 32 : 64);
+        for (int i = 0; i < n; ++i) {
+          const Sample& sm = buf[i];
+          put(src, dst, width, height, sm.x, y, sample(src, width, height, sm.xi, sm.yi, sm.fx, sm.fy), half);
+        }
+      }
+    }
+  };
+  if (overlap) {
+    band(0, rows.count);
+  } else {
+    px_for_rows(rows.count, [&](int r0, int r1) { band(r0, r1); }, half ? 32 : 64);
+  }
 }
 
 // The columns of row y within the disc dx^2 + dy^2 <= limit around cx (none
