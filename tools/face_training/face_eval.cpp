@@ -318,7 +318,9 @@ void diagnose_real(const std::string& data) {
   int tooFewHits[4] = {};             // too-few faces by their windows passing at IoU >= 0.5: 1, 2, 3, more
   int tooFewSplit = 0;                // too-few faces whose hits fell into more than one candidate
   int unboundedFound = 0;
+  std::vector<double> lastMargins;  // no-hit faces: least last-stage sum near them over the threshold, minus 1
   std::map<std::string, int> perPhoto;
+  std::map<std::string, std::string> perPhotoClass;  // one letter per missed face
   for (const auto& [photo, truth] : boxes) {
     cv::Mat bgr = cv::imread(dir + "/photos/" + photo, cv::IMREAD_COLOR);
     if (bgr.empty()) continue;
@@ -336,6 +338,7 @@ void diagnose_real(const std::string& data) {
     // Every window of every level, in the scan's order.
     std::vector<DiagHit> hits;
     std::vector<cv::Rect2d> lastStage;  // windows reaching the last stage (photo coordinates)
+    std::vector<int> lastSum;           // and their last-stage sums
     const int longer = std::max(ww, wh), shorter = std::min(ww, wh);
     const int r = static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
     for (int lev = 0; lev < fd_pyramid_count(1); ++lev) {
@@ -365,7 +368,7 @@ void diagnose_real(const std::string& data) {
           if (passed == kFdStageCount)
             hits.push_back({box, sum / 2});
           else
-            lastStage.push_back(to_photo(box));
+            lastStage.push_back(to_photo(box)), lastSum.push_back(sum);
         }
     }
     DiagReplay bounded{kFdListSize, {}, {}, {}, {}, {}, {}}, unbounded{1 << 30, {}, {}, {}, {}, {}, {}};
@@ -419,9 +422,11 @@ void diagnose_real(const std::string& data) {
       } else if (near.empty()) {
         c = kNoHit;
         noHitNear3 += near3;
-        bool last = false;
-        for (const cv::Rect2d& w : lastStage) last |= iou(truth[t], w) >= 0.5;
-        noHitLast += last;
+        int best = -1;
+        for (size_t w = 0; w < lastStage.size(); ++w)
+          if (iou(truth[t], lastStage[w]) >= 0.5 && (best < 0 || lastSum[w] < best)) best = lastSum[w];
+        noHitLast += best >= 0;
+        if (best >= 0) lastMargins.push_back(double(best) / kFdStageThresholds[kFdStageCount - 1] - 1);
       } else {
         int dropped = 0;
         std::vector<int> roots;
@@ -454,6 +459,7 @@ void diagnose_real(const std::string& data) {
       unboundedFound += m5u[t] >= 0;
       ++cls[c], ++clsBin[c][b];
       ++perPhoto[photo];
+      perPhotoClass[photo] += "nlmbtw"[c];
     }
   }
   std::printf("Where the faces missed at IoU 0.5 are lost (mode 1, upright pass replayed; replay equal to the engine on "
@@ -468,12 +474,18 @@ void diagnose_real(const std::string& data) {
   }
   std::printf("no window: %d of them have a hit at IoU >= 0.3, %d a window reaching the last stage at IoU >= 0.5\n",
               noHitNear3, noHitLast);
+  std::sort(lastMargins.begin(), lastMargins.end());
+  if (!lastMargins.empty()) {
+    std::printf("no window: their least last-stage sum at IoU >= 0.5 exceeds the threshold by (quartiles)");
+    for (int q = 0; q <= 4; ++q) std::printf(" %.3f", lastMargins[std::min(lastMargins.size() - 1, q * lastMargins.size() / 4)]);
+    std::printf(" of it\n");
+  }
   std::printf("too few hits: windows passing at IoU >= 0.5: 1: %d, 2: %d, 3: %d, 4 or more: %d; hits split over more "
               "than one candidate: %d\n",
               tooFewHits[0], tooFewHits[1], tooFewHits[2], tooFewHits[3], tooFewSplit);
   std::printf("missed faces an unbounded candidate list would find: %d\n", unboundedFound);
-  std::printf("missed faces by photo:");
-  for (const auto& [p, n] : perPhoto) std::printf(" %s %d;", p.c_str(), n);
+  std::printf("missed faces by photo (n no window, l list, m merged, b box, t too few, w working coordinates):");
+  for (const auto& [p, n] : perPhoto) std::printf(" %s %d %s;", p.c_str(), n, perPhotoClass[p].c_str());
   std::printf("\n");
 }
 
