@@ -598,7 +598,7 @@ int main(int argc, char** argv) {
     // FACE_SHIFT_Y: vertical shift range when it should differ (the scan
     // steps two rows at a time, one column).
     const double shiftY = env_num("FACE_SHIFT_Y", shift);
-    const int copies = static_cast<int>(env_num("FACE_COPIES", 3));
+    const int copies = static_cast<int>(env_num("FACE_COPIES", 8));
     // FACE_AUG: scale of every augmentation probability (0: clean copies only);
     // FACE_YAW: largest stretch across (1.1: the face 10 % wider or narrower).
     const double augScale = env_num("FACE_AUG", 0.6), yaw = env_num("FACE_YAW", 1.1);
@@ -693,7 +693,7 @@ int main(int argc, char** argv) {
     // The written table keeps FACE_FINAL_KEEP of the calibration windows at
     // the last stage (chosen on the real validation photos); the last stage is
     // trained and bootstrapped at the keep rate of FACE_KEEP.
-    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.80);
+    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.83);
     if (finalKeep != sp.keep.back())
       cascade.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, finalKeep);
     std::fprintf(report, "face table written with the last stage keeping %g of the calibration windows\n", finalKeep);
