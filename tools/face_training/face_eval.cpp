@@ -20,6 +20,9 @@
 
 #include "common.h"
 #include "effect/face/face_engine.h"
+#include "effect/face/fd_detector.h"
+#include "effect/face/models/face_models.h"
+#include "effect/face/sm_image.h"
 
 namespace {
 double now() {
@@ -206,6 +209,286 @@ void draw_real(const std::string& data, const std::string& out) {
   }
 }
 
+
+// ---- Where the missed real faces are lost (face_eval --diagnose DATA_DIR) ----
+// The upright pass replayed step by step with the detector's rules: every
+// window of every pyramid level through the cascade (fd_eval_window), the
+// hits enrolled into the candidate list (joining the first candidate they
+// overlap, the least confident hit giving the box, overlapping candidates
+// merged), candidates with three or more hits kept and overlapping faces
+// resolved. The replay must give exactly the engine's mode 1 faces on every
+// photo; it records where each hit went, so that each face missed at IoU 0.5
+// can be put in the first of these classes that applies:
+//   no hit: no window passing all four stages has IoU >= 0.5 with it;
+//   list full: its hits came after the candidate list had its 20 entries
+//     (all of them, or some and a replay with an unbounded list finds it);
+//   merged: its hits ended in a candidate of three or more hits whose box
+//     lies elsewhere (a neighbouring face, a larger or shifted stray box),
+//     or in a face that an overlapping face of lower confidence removed;
+//   box off: its hits made a face whose box overlaps it at 0.3 <= IoU < 0.5;
+//   too few hits: its hits ended in candidates of fewer than three hits.
+// A face the detector finds as its eleventh or later is reported in working
+// coordinates (the analyser maps only ten faces back); such faces are
+// counted apart.
+struct DiagHit {
+  SMyRect2 box;  // working-image coordinates
+  int conf;
+};
+
+struct DiagReplay {
+  int limit;
+  std::vector<SMyRect2> rect;
+  std::vector<int> conf, count, parent;
+  std::vector<unsigned char> valid;
+  std::vector<int> where;  // candidate of each hit, -1 when the list was full
+  int n = 0;
+  void enrol(const DiagHit& h) {
+    if (n > limit - 1) {
+      where.push_back(-1);
+      return;
+    }
+    int joined = -1;
+    for (int i = 0; i < n; ++i) {
+      if (!valid[i] || !fd_isintersection(rect[i], h.box)) continue;
+      count[i] += 1;
+      if (conf[i] > h.conf) rect[i] = h.box, conf[i] = h.conf;
+      joined = i;
+      break;
+    }
+    if (joined < 0) {
+      rect.push_back(h.box), conf.push_back(h.conf), count.push_back(1), valid.push_back(1), parent.push_back(-1);
+      joined = n++;
+    }
+    where.push_back(joined);
+    for (int i = 0; i < n; ++i) {
+      if (!valid[i]) continue;
+      for (int j = i + 1; j < n; ++j) {
+        if (!valid[j] || !fd_isintersection(rect[i], rect[j])) continue;
+        if (conf[j] < conf[i]) {
+          valid[i] = 0, count[j] += count[i], parent[i] = j;
+        } else {
+          valid[j] = 0, count[i] += count[j], parent[j] = i;
+        }
+      }
+    }
+  }
+  // The candidate a hit's candidate ended in (following the merges).
+  int root(int c) const {
+    for (int steps = 0; c >= 0 && parent[c] >= 0 && steps < 64; ++steps) c = parent[c];
+    return c;
+  }
+  // Kept candidates (three hits or more), then overlapping faces resolved as
+  // the final step does: the indices of the candidates that end as faces.
+  std::vector<int> faces() const {
+    std::vector<int> kept;
+    for (int i = 0; i < n; ++i)
+      if (valid[i] && count[i] >= 3 && static_cast<int>(kept.size()) < kFdListSize) kept.push_back(i);
+    std::vector<unsigned char> ok(kept.size(), 1);
+    for (size_t i = 0; i < kept.size(); ++i) {
+      if (!ok[i]) continue;
+      for (size_t j = i + 1; j < kept.size(); ++j) {
+        if (!ok[j] || !fd_isintersection(rect[kept[i]], rect[kept[j]])) continue;
+        if (conf[kept[i]] > conf[kept[j]])
+          ok[i] = 0;
+        else
+          ok[j] = 0;
+      }
+    }
+    std::vector<int> out;
+    for (size_t i = 0; i < kept.size(); ++i)
+      if (ok[i]) out.push_back(kept[i]);
+    return out;
+  }
+};
+
+void diagnose_real(const std::string& data) {
+  const std::string dir = data + "/real-photo-faces";
+  std::map<std::string, std::vector<cv::Rect2d>> boxes = real_boxes(dir);
+  for (const std::string& p : list_images(dir + "/photos")) boxes[p.substr(dir.size() + 8)];
+  enum { kNoHit, kListFull, kMerged, kBoxOff, kTooFew, kUnmapped, kClasses };
+  const char* names[kClasses] = {"no window passes the cascade at IoU >= 0.5",
+                                 "dropped: the candidate list already had its 20 entries",
+                                 "merged into a neighbouring candidate or face",
+                                 "found, but the box has IoU < 0.5",
+                                 "passes, but fewer than three hits in its candidate",
+                                 "found, but after the tenth face: left in working coordinates"};
+  int cls[kClasses] = {}, clsBin[kClasses][RealTally::kBins] = {};
+  int faces = 0, found = 0, agree = 0, photos = 0;
+  int noHitNear3 = 0, noHitLast = 0;  // no-hit faces with a hit at IoU >= 0.3; with a window reaching the last stage
+  int tooFewHits[4] = {};             // too-few faces by their windows passing at IoU >= 0.5: 1, 2, 3, more
+  int tooFewSplit = 0;                // too-few faces whose hits fell into more than one candidate
+  int unboundedFound = 0;
+  std::vector<double> lastMargins;  // no-hit faces: least last-stage sum near them over the threshold, minus 1
+  std::map<std::string, int> perPhoto;
+  std::map<std::string, std::string> perPhotoClass;  // one letter per missed face
+  for (const auto& [photo, truth] : boxes) {
+    cv::Mat bgr = cv::imread(dir + "/photos/" + photo, cv::IMREAD_COLOR);
+    if (bgr.empty()) continue;
+    ++photos;
+    std::vector<int> argb = to_argb(bgr);
+    int ww, wh;
+    caIF_WorkingSize(bgr.cols, bgr.rows, &ww, &wh);
+    const int64_t k = (static_cast<int64_t>(bgr.cols) << 15) / ww;
+    std::vector<unsigned char> grey(static_cast<size_t>(ww) * wh);
+    Resize_NN_Color2Gray(argb.data(), bgr.cols, bgr.rows, grey.data(), ww, wh);
+    auto to_photo = [k](const SMyRect2& r) {
+      auto m = [k](int v) { return static_cast<double>(static_cast<int32_t>((v * k) >> 15)); };
+      return cv::Rect2d(m(r.left), m(r.top), m(r.right - r.left), m(r.bottom - r.top));
+    };
+    // Every window of every level, in the scan's order.
+    std::vector<DiagHit> hits;
+    std::vector<cv::Rect2d> lastStage;  // windows reaching the last stage (photo coordinates)
+    std::vector<int> lastSum;           // and their last-stage sums
+    const int longer = std::max(ww, wh), shorter = std::min(ww, wh);
+    const int r = static_cast<int>((static_cast<int64_t>(shorter) << 15) / longer);
+    for (int lev = 0; lev < fd_pyramid_count(1); ++lev) {
+      const int s = kFdPyramid[lev];
+      if (s > longer) break;
+      int other = ww == wh ? s : static_cast<int>((static_cast<int64_t>(s) * r) >> 15);
+      other = std::max(other, 4);
+      const int lw = ww >= wh ? s : other, lh = ww >= wh ? other : s;
+      std::vector<unsigned char> level(static_cast<size_t>(lw) * lh);
+      const unsigned char* img = grey.data();
+      if (lw != ww || lh != wh) {
+        Resize_NN(grey.data(), ww, wh, level.data(), lw, lh);
+        img = level.data();
+      }
+      std::vector<unsigned short> mct(static_cast<size_t>(lw) * lh, 0);
+      image2MCT_FD(img, lw, lh, mct.data());
+      if (lh <= kFdWindowH || lw <= kFdWindowW) continue;
+      const int64_t scale = (static_cast<int64_t>(ww) << 15) / lw;
+      for (int y = 0; y < lh - kFdWindowH; y += 2)
+        for (int x = 0; x < lw - kFdWindowW; ++x) {
+          int sum = 0;
+          const int passed = fd_eval_window(mct.data(), lw, x, y, &sum);
+          if (passed < kFdStageCount - 1) continue;
+          const int bx = static_cast<int>((x * scale) >> 15), by = static_cast<int>((y * scale) >> 15);
+          SMyRect2 box{bx, by, bx + static_cast<int>((kFdWindowW * scale) >> 15),
+                       by + static_cast<int>((kFdWindowH * scale) >> 15)};
+          if (passed == kFdStageCount)
+            hits.push_back({box, sum / 2});
+          else
+            lastStage.push_back(to_photo(box)), lastSum.push_back(sum);
+        }
+    }
+    DiagReplay bounded{kFdListSize, {}, {}, {}, {}, {}, {}}, unbounded{1 << 30, {}, {}, {}, {}, {}, {}};
+    for (const DiagHit& h : hits) bounded.enrol(h), unbounded.enrol(h);
+    std::vector<int> finals = bounded.faces(), finalsU = unbounded.faces();
+    std::vector<cv::Rect2d> replayed, replayedU;
+    // The analyser maps only its first ten faces back to photo coordinates;
+    // the later ones keep working coordinates (a rule of the analyser).
+    std::vector<cv::Rect2d> mapped;
+    for (int c : finals) {
+      const SMyRect2& q = bounded.rect[c];
+      mapped.push_back(to_photo(q));
+      replayed.push_back(replayed.size() < 10 ? to_photo(q) : cv::Rect2d(q.left, q.top, q.right - q.left, q.bottom - q.top));
+    }
+    for (int c : finalsU) replayedU.push_back(to_photo(unbounded.rect[c]));
+    // The replay against the engine itself.
+    std::vector<cv::Rect2d> engine = run_engine(bgr, 1);
+    bool same = engine.size() == replayed.size();
+    for (size_t i = 0; same && i < engine.size(); ++i) same = engine[i] == replayed[i];
+    agree += same;
+    if (!same) {
+      std::printf("  replay differs from the engine on %s (%zu against %zu faces)\n", photo.c_str(), replayed.size(), engine.size());
+      for (size_t i = 0; i < std::max(engine.size(), replayed.size()); ++i) {
+        if (i < replayed.size()) std::printf("   replay %.0f %.0f %.0f %.0f", replayed[i].x, replayed[i].y, replayed[i].width, replayed[i].height);
+        if (i < engine.size()) std::printf("   engine %.0f %.0f %.0f %.0f", engine[i].x, engine[i].y, engine[i].width, engine[i].height);
+        std::printf("\n");
+      }
+    }
+    std::vector<int> m5 = RealTally::match(truth, engine, 0.5), m5u = RealTally::match(truth, replayedU, 0.5);
+    std::vector<int> m5m = RealTally::match(truth, mapped, 0.5);
+    std::vector<cv::Rect2d> hitPhoto;
+    for (const DiagHit& h : hits) hitPhoto.push_back(to_photo(h.box));
+    for (size_t t = 0; t < truth.size(); ++t) {
+      ++faces;
+      if (m5[t] >= 0) {
+        ++found;
+        continue;
+      }
+      const double working = 640.0 / std::max(bgr.cols, bgr.rows);
+      const int b = RealTally::bin(truth[t].width * working);
+      std::vector<size_t> near;
+      bool near3 = false;
+      for (size_t h = 0; h < hits.size(); ++h) {
+        const double v = iou(truth[t], hitPhoto[h]);
+        if (v >= 0.5) near.push_back(h);
+        near3 |= v >= 0.3;
+      }
+      int c = kTooFew;
+      if (m5m[t] >= 0) {
+        c = kUnmapped;
+      } else if (near.empty()) {
+        c = kNoHit;
+        noHitNear3 += near3;
+        int best = -1;
+        for (size_t w = 0; w < lastStage.size(); ++w)
+          if (iou(truth[t], lastStage[w]) >= 0.5 && (best < 0 || lastSum[w] < best)) best = lastSum[w];
+        noHitLast += best >= 0;
+        if (best >= 0) lastMargins.push_back(double(best) / kFdStageThresholds[kFdStageCount - 1] - 1);
+      } else {
+        int dropped = 0;
+        std::vector<int> roots;
+        for (size_t h : near) {
+          if (bounded.where[h] < 0) {
+            ++dropped;
+            continue;
+          }
+          const int rt = bounded.root(bounded.where[h]);
+          if (std::find(roots.begin(), roots.end(), rt) == roots.end()) roots.push_back(rt);
+        }
+        if (dropped == static_cast<int>(near.size()) || (dropped > 0 && m5u[t] >= 0)) {
+          c = kListFull;
+        } else {
+          bool boxOff = false, merged = false;
+          for (int rt : roots) {
+            const bool isFace = std::find(finals.begin(), finals.end(), rt) != finals.end();
+            if (isFace && iou(truth[t], to_photo(bounded.rect[rt])) >= 0.3)
+              boxOff = true;
+            else if (bounded.count[rt] >= 3)
+              merged = true;
+          }
+          c = boxOff ? kBoxOff : merged ? kMerged : kTooFew;
+          if (c == kTooFew) {
+            ++tooFewHits[std::min<size_t>(near.size(), 4) - 1];
+            tooFewSplit += roots.size() > 1;
+          }
+        }
+      }
+      unboundedFound += m5u[t] >= 0;
+      ++cls[c], ++clsBin[c][b];
+      ++perPhoto[photo];
+      perPhotoClass[photo] += "nlmbtw"[c];
+    }
+  }
+  std::printf("Where the faces missed at IoU 0.5 are lost (mode 1, upright pass replayed; replay equal to the engine on "
+              "%d of %d photos)\n",
+              agree, photos);
+  std::printf("%d faces, %d found at IoU 0.5, %d missed\n", faces, found, faces - found);
+  std::printf("| lost at | faces | by width <30 / 30-45 / 45-60 / 60-100 / >=100 |\n|---|---|---|\n");
+  for (int c = 0; c < kClasses; ++c) {
+    std::printf("| %s | %d |", names[c], cls[c]);
+    for (int b = 0; b < RealTally::kBins; ++b) std::printf("%s%d", b ? " / " : " ", clsBin[c][b]);
+    std::printf(" |\n");
+  }
+  std::printf("no window: %d of them have a hit at IoU >= 0.3, %d a window reaching the last stage at IoU >= 0.5\n",
+              noHitNear3, noHitLast);
+  std::sort(lastMargins.begin(), lastMargins.end());
+  if (!lastMargins.empty()) {
+    std::printf("no window: their least last-stage sum at IoU >= 0.5 exceeds the threshold by (quartiles)");
+    for (int q = 0; q <= 4; ++q) std::printf(" %.3f", lastMargins[std::min(lastMargins.size() - 1, q * lastMargins.size() / 4)]);
+    std::printf(" of it\n");
+  }
+  std::printf("too few hits: windows passing at IoU >= 0.5: 1: %d, 2: %d, 3: %d, 4 or more: %d; hits split over more "
+              "than one candidate: %d\n",
+              tooFewHits[0], tooFewHits[1], tooFewHits[2], tooFewHits[3], tooFewSplit);
+  std::printf("missed faces an unbounded candidate list would find: %d\n", unboundedFound);
+  std::printf("missed faces by photo (n no window, l list, m merged, b box, t too few, w working coordinates):");
+  for (const auto& [p, n] : perPhoto) std::printf(" %s %d %s;", p.c_str(), n, perPhotoClass[p].c_str());
+  std::printf("\n");
+}
+
 void real_eval(const std::string& data, const std::string& cvdir) {
   const std::string dir = data + "/real-photo-faces";
   std::map<std::string, std::vector<cv::Rect2d>> boxes = real_boxes(dir);
@@ -282,6 +565,10 @@ int main(int argc, char** argv) {
   }
   if (argc == 4 && std::string(argv[1]) == "--draw") {  // face_eval --draw DATA_DIR OUT_DIR: the real photos with boxes
     draw_real(argv[2], argv[3]);
+    return 0;
+  }
+  if (argc == 3 && std::string(argv[1]) == "--diagnose") {  // face_eval --diagnose DATA_DIR: where missed faces are lost
+    diagnose_real(argv[2]);
     return 0;
   }
   if (argc < 2) {

@@ -595,7 +595,10 @@ int main(int argc, char** argv) {
     // copies with random scale (about one pyramid step), roll and shift.
     const std::vector<double> scaleRange = env_list("FACE_SCALE", {0.87, 1.15});
     const double shift = env_num("FACE_SHIFT", 1.2), rollRange = env_num("FACE_ROLL", 0.17);
-    const int copies = static_cast<int>(env_num("FACE_COPIES", 3));
+    // FACE_SHIFT_Y: vertical shift range when it should differ (the scan
+    // steps two rows at a time, one column).
+    const double shiftY = env_num("FACE_SHIFT_Y", shift);
+    const int copies = static_cast<int>(env_num("FACE_COPIES", 8));
     // FACE_AUG: scale of every augmentation probability (0: clean copies only);
     // FACE_YAW: largest stretch across (1.1: the face 10 % wider or narrower).
     const double augScale = env_num("FACE_AUG", 0.6), yaw = env_num("FACE_YAW", 1.1);
@@ -625,7 +628,7 @@ int main(int argc, char** argv) {
           double s = d / kEyeDist * scale;
           const double stretch = std::exp(uni(-std::log(yaw), std::log(yaw)));
           sample_window(g, (p.lx + p.rx) / 2, (p.ly + p.ry) / 2, a + roll, s, kEyeMidX + uni(-shift, shift),
-                        kEyeMidY + uni(-shift, shift), 22, 24, win, stretch);
+                        kEyeMidY + uni(-shiftY, shiftY), 22, 24, win, stretch);
           if (augScale > 0) augment(win, 22, 24, aug);
           std::fill(mct.begin(), mct.end(), 0);
           image2MCT_FD(win.data(), 22, 24, mct.data());
@@ -690,7 +693,7 @@ int main(int argc, char** argv) {
     // The written table keeps FACE_FINAL_KEEP of the calibration windows at
     // the last stage (chosen on the real validation photos); the last stage is
     // trained and bootstrapped at the keep rate of FACE_KEEP.
-    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.80);
+    const double finalKeep = env_num("FACE_FINAL_KEEP", 0.83);
     if (finalKeep != sp.keep.back())
       cascade.back() = quantise(sp, sp.features.size() - 1, sweep.raw, sweep.cal, finalKeep);
     std::fprintf(report, "face table written with the last stage keeping %g of the calibration windows\n", finalKeep);
