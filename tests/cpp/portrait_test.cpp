@@ -664,6 +664,15 @@ TEST(PreviewSampling, OutfocusPreviewBlursTheReducedPhoto) {
   // Strength 0 still blurs the preview a little (radius 3 -> 1); a negative
   // strength is refused.
   EXPECT_EQ(px_control_outfocusing_in_portrait_preview(src.data(), w, h, prev.data(), pw, ph, -2), 40971);
+  // A preview more than 4096 times wider than the photo: every sample is the
+  // first pixel (a step below one 4096th is 0), and it is not divided by.
+  const int wide = w * 4096 + 1;
+  std::vector<int> line(static_cast<size_t>(wide), 6);
+  ASSERT_EQ(px_control_outfocusing_in_portrait_preview(src.data(), w, h, line.data(), wide, 1, 3), 40960);
+  for (int shift = 0; shift <= 16; shift += 8) {
+    const int want = (src[0] >> shift) & 0xFF;
+    for (int i : {0, wide / 2, wide - 1}) EXPECT_NEAR((line[static_cast<size_t>(i)] >> shift) & 0xFF, want, 1) << i;
+  }
   px_finish_portrait();
   px_set_facebeauty(2, 3, 3);
 }

@@ -438,12 +438,15 @@ int px_control_outfocusing_in_portrait_preview(const int* src, int width, int he
     for (int j = 0; j < s.ny; ++j)
       for (int i = 0; i < s.nx; ++i)
         small[static_cast<size_t>(j) * s.nx + i] = src[static_cast<size_t>(s.ys[j]) * width + s.xs[i]];
-    const int64_t radius = ((static_cast<int64_t>(px_blur_outfocus_radius(strength)) << 12) + s.step / 2) / s.step;
+    // A preview more than 4096 times the photo's width has a step of 0:
+    // taken as the smallest step there is.
+    const int64_t step = s.step > 0 ? s.step : 1;
+    const int64_t radius = ((static_cast<int64_t>(px_blur_outfocus_radius(strength)) << 12) + step / 2) / step;
     rc = px_blur_variable(small, blurred, s.nx, s.ny, radius < 1 ? 1 : static_cast<int>(radius)) == 0 ? PX_OK
                                                                                                        : PX_ERR_EFFECT;
     if (rc == PX_OK && !memory_held(failures)) rc = PX_ERR_ALLOC;  // nothing was blurred
     if (rc == PX_OK) {
-      auto to_preview = [&s](int32_t v) { return static_cast<int32_t>((static_cast<int64_t>(v) << 12) / s.step); };
+      auto to_preview = [step](int32_t v) { return static_cast<int32_t>((static_cast<int64_t>(v) << 12) / step); };
       for (int f = 0; f < faces; ++f) {
         const caFaceBox& b = g_FE->faceRect[f];
         scaled[f] = {to_preview(b.x), to_preview(b.y), to_preview(b.width), to_preview(b.height)};
