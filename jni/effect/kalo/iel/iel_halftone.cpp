@@ -108,16 +108,15 @@ int IEL_Halftone_AnalyseCircleRadius(const unsigned char* plane, int width, int 
   }
 }
 
-// Dot geometry: the screen lines run in the direction (1, slope) (x right,
-// y down), normalised; they are spaced four cells (channel 1) or two cells
-// (channels 2 and 3) apart measured across the lines, and each line carries a
-// dot every cell along it. The lines are laid over the square of side
-// max(width, height) from the top-left corner, so every screen covers the
-// picture whatever its orientation.
-void IEL_Halftone_HalftonePerChannel(const unsigned char* plane, unsigned char* screen, int width, int height,
-                                     int cell, double slope, int channel) {
-  std::memset(screen, 0, static_cast<size_t>(width) * static_cast<size_t>(height));
-  const Screen s{plane, screen, width, height, cell, channel};
+namespace {
+// The screen's lines: the unit step along a line (dx, dy) and across the
+// lines (nx, ny), their spacing, and the range of lines j0..j1 and of dots
+// along a line t0..t1 that covers the square.
+struct ScreenLines {
+  double dx, dy, nx, ny;
+  int spacing, j0, j1, t0, t1;
+};
+ScreenLines screen_lines(int width, int height, int cell, double slope, int channel) {
   const double norm = std::sqrt(1 + slope * slope);
   const double dx = 1 / norm, dy = slope / norm;  // along a line
   const double nx = -dy, ny = dx;                  // across the lines
@@ -131,8 +130,31 @@ void IEL_Halftone_HalftonePerChannel(const unsigned char* plane, unsigned char* 
     amin = a < amin ? a : amin, amax = a > amax ? a : amax;
     bmin = b < bmin ? b : bmin, bmax = b > bmax ? b : bmax;
   }
-  const int j0 = static_cast<int>(std::floor(bmin / spacing)), j1 = static_cast<int>(std::ceil(bmax / spacing));
-  const int t0 = static_cast<int>(std::floor(amin / cell)), t1 = static_cast<int>(std::ceil(amax / cell));
+  return {dx,
+          dy,
+          nx,
+          ny,
+          spacing,
+          static_cast<int>(std::floor(bmin / spacing)),
+          static_cast<int>(std::ceil(bmax / spacing)),
+          static_cast<int>(std::floor(amin / cell)),
+          static_cast<int>(std::ceil(amax / cell))};
+}
+}  // namespace
+
+// Dot geometry: the screen lines run in the direction (1, slope) (x right,
+// y down), normalised; they are spaced four cells (channel 1) or two cells
+// (channels 2 and 3) apart measured across the lines, and each line carries a
+// dot every cell along it. The lines are laid over the square of side
+// max(width, height) from the top-left corner, so every screen covers the
+// picture whatever its orientation.
+void IEL_Halftone_HalftonePerChannel(const unsigned char* plane, unsigned char* screen, int width, int height,
+                                     int cell, double slope, int channel) {
+  std::memset(screen, 0, static_cast<size_t>(width) * static_cast<size_t>(height));
+  const Screen s{plane, screen, width, height, cell, channel};
+  const ScreenLines lines = screen_lines(width, height, cell, slope, channel);
+  const double dx = lines.dx, dy = lines.dy, nx = lines.nx, ny = lines.ny;
+  const int spacing = lines.spacing, j0 = lines.j0, j1 = lines.j1, t0 = lines.t0, t1 = lines.t1;
   for (int j = j0; j <= j1; ++j) {
     IEL_Halftone_Line_Circle(s, j * spacing * nx, j * spacing * ny, dx, dy, t0, t1);
   }
@@ -226,20 +248,9 @@ void dot_rows(unsigned char* screen, int w, int y0, int y1, int cx, int cy, int 
 // same expressions) and radii.
 void screen_banded(const unsigned char* plane, unsigned char* screen, int width, int height, int cell, double slope,
                    int channel) {
-  const double norm = std::sqrt(1 + slope * slope);
-  const double dx = 1 / norm, dy = slope / norm;
-  const double nx = -dy, ny = dx;
-  const int spacing = (channel == 1 ? 4 : 2) * cell;
-  const double side = width > height ? width : height;
-  double amin = 0, amax = 0, bmin = 0, bmax = 0;
-  const double corners[4][2] = {{0, 0}, {side, 0}, {0, side}, {side, side}};
-  for (const auto& c : corners) {
-    const double a = c[0] * dx + c[1] * dy, b = c[0] * nx + c[1] * ny;
-    amin = a < amin ? a : amin, amax = a > amax ? a : amax;
-    bmin = b < bmin ? b : bmin, bmax = b > bmax ? b : bmax;
-  }
-  const int j0 = static_cast<int>(std::floor(bmin / spacing)), j1 = static_cast<int>(std::ceil(bmax / spacing));
-  const int t0 = static_cast<int>(std::floor(amin / cell)), t1 = static_cast<int>(std::ceil(amax / cell));
+  const ScreenLines lines = screen_lines(width, height, cell, slope, channel);
+  const double dx = lines.dx, dy = lines.dy, nx = lines.nx, ny = lines.ny;
+  const int spacing = lines.spacing, j0 = lines.j0, j1 = lines.j1, t0 = lines.t0, t1 = lines.t1;
   px_for_rows(height, [&](int y0, int y1) {
     std::memset(screen + static_cast<size_t>(y0) * width, 0, static_cast<size_t>(y1 - y0) * width);
     for (int j = j0; j <= j1; ++j) {
