@@ -25,16 +25,17 @@ void span(unsigned char* screen, int w, int h, int y, int x0, int x1) {
   for (int x = x0; x <= x1; ++x) IEL_DrawPixel(screen, w, h, x, y);
 }
 
-// A dot of radius r by the midpoint circle method, filled: every pair of
-// symmetric points on the circle is joined by a row of ink, so a dot reads
-// as a solid printed dot rather than a ring.
-void IEL_Halftone_bresan_circle(unsigned char* screen, int w, int h, int cx, int cy, int r) {
+// The rows of ink of a filled dot of radius r by the midpoint circle method:
+// every pair of symmetric points on the circle is joined, so a dot reads as
+// a solid printed dot rather than a ring. row(y, x0, x1) inks x0..x1 of row y.
+template <class Row>
+void dot_spans(int cx, int cy, int r, Row row) {
   int x = r, y = 0, err = 1 - r;
   while (x >= y) {
-    span(screen, w, h, cy + y, cx - x, cx + x);
-    span(screen, w, h, cy - y, cx - x, cx + x);
-    span(screen, w, h, cy + x, cx - y, cx + y);
-    span(screen, w, h, cy - x, cx - y, cx + y);
+    row(cy + y, cx - x, cx + x);
+    row(cy - y, cx - x, cx + x);
+    row(cy + x, cx - y, cx + y);
+    row(cy - x, cx - y, cx + y);
     ++y;
     if (err < 0) {
       err += 2 * y + 1;
@@ -43,6 +44,11 @@ void IEL_Halftone_bresan_circle(unsigned char* screen, int w, int h, int cx, int
       err += 2 * (y - x) + 1;
     }
   }
+}
+
+// A filled dot of radius r.
+void IEL_Halftone_bresan_circle(unsigned char* screen, int w, int h, int cx, int cy, int r) {
+  dot_spans(cx, cy, r, [&](int y, int x0, int x1) { span(screen, w, h, y, x0, x1); });
 }
 
 struct Screen {
@@ -226,20 +232,7 @@ void dot_rows(unsigned char* screen, int w, int y0, int y1, int cx, int cy, int 
     xb = xb > w - 1 ? w - 1 : xb;
     if (xa <= xb) std::memset(screen + static_cast<size_t>(y) * w + xa, 255, static_cast<size_t>(xb - xa + 1));
   };
-  int x = r, y = 0, err = 1 - r;
-  while (x >= y) {
-    span(cy + y, cx - x, cx + x);
-    span(cy - y, cx - x, cx + x);
-    span(cy + x, cx - y, cx + y);
-    span(cy - x, cx - y, cx + y);
-    ++y;
-    if (err < 0) {
-      err += 2 * y + 1;
-    } else {
-      --x;
-      err += 2 * (y - x) + 1;
-    }
-  }
+  dot_spans(cx, cy, r, span);
 }
 
 // IEL_Halftone_HalftonePerChannel over row bands: a screen is the union of
